@@ -1,0 +1,339 @@
+#include "ZonCloudReadFile.h"
+
+#include <cerrno>
+#include <new>
+
+#include <sys/stat.h>
+
+#include "ZonCloudOperErrorTool.h"
+#include "ZonCloudReadNLSTool.h"
+
+ZonCloudReadFile::ZonCloudReadFile(const ZonUnicodeString& fileName) : _fileName(fileName) {}
+
+ZonCloudReadFile::~ZonCloudReadFile() { CloseFile(); }
+
+void ZonCloudReadFile::GetFileName(ZonUnicodeString& name) { name = _fileName; }
+
+void ZonCloudReadFile::SetSamplingPercent(float percent)
+{
+    if (percent < 0.0f || percent > 100.0f)
+        ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Usage, "ERR_InvalidPercentValue");
+    if (percent == _samplingPercent) return;
+    _samplingPercent = percent;
+    ClearBoxCaches();
+}
+
+float ZonCloudReadFile::GetSamplingPercent() { return _samplingPercent; }
+
+int ZonCloudReadFile::GetNumberOfPoints()
+{
+    Analyse();
+    return _numberOfPoints;
+}
+
+const double* ZonCloudReadFile::GetPointsDouble(unsigned&) { return nullptr; }
+
+const unsigned char* ZonCloudReadFile::GetPointColors(unsigned& count)
+{
+    count = 0;
+    return nullptr;
+}
+
+const void* ZonCloudReadFile::GetPointAttributes1(unsigned& count)
+{
+    count = 0;
+    return nullptr;
+}
+
+const void* ZonCloudReadFile::GetPointAttributes2(unsigned& count)
+{
+    count = 0;
+    return nullptr;
+}
+
+const void* ZonCloudReadFile::GetPointAttributes3(unsigned& count)
+{
+    count = 0;
+    return nullptr;
+}
+
+void ZonCloudReadFile::GetBoundingBox(ZonMathBox& box)
+{
+    Analyse();
+    box = _boundingBox;
+}
+
+int ZonCloudReadFile::GetTypeOfDigitization()
+{
+    Analyse();
+    return _digitizationType;
+}
+
+bool ZonCloudReadFile::IsTypeOfDigitization(int type)
+{
+    Analyse();
+    return _digitizationType == type;
+}
+
+ZonICkeUnit_var ZonCloudReadFile::GetLengthUnit() { return nullptr; }
+
+bool ZonCloudReadFile::HasDoublePrecision() { return false; }
+
+void ZonCloudReadFile::BeginGetSetOfScans() {}
+bool ZonCloudReadFile::NextSetOfScans() { return false; }
+void ZonCloudReadFile::BeginGetScan() {}
+bool ZonCloudReadFile::NextScan() { return false; }
+
+const float* ZonCloudReadFile::GetScanPoints(unsigned& count)
+{
+    count = 0;
+    return nullptr;
+}
+
+const double* ZonCloudReadFile::GetScanPointsDouble(unsigned& count)
+{
+    count = 0;
+    return nullptr;
+}
+
+void ZonCloudReadFile::BeginGetGrid() {}
+bool ZonCloudReadFile::NextGrid() { return false; }
+void ZonCloudReadFile::BeginGetGridPoints() {}
+
+const float* ZonCloudReadFile::GetGridPoints(unsigned& count, const unsigned char*& valid)
+{
+    count = 0;
+    valid = nullptr;
+    return nullptr;
+}
+
+const double* ZonCloudReadFile::GetGridPointsDouble(unsigned& count, const unsigned char*& valid)
+{
+    count = 0;
+    valid = nullptr;
+    return nullptr;
+}
+
+bool ZonCloudReadFile::IsInQueryBox(double x, double y, double z, const ZonMathBox& query, const ZonMathBox& file)
+{
+    const double v[3] = {x, y, z};
+    const ZonMathPoint& low = query.GetLow();
+    const ZonMathPoint& high = query.GetHigh();
+    const ZonMathPoint& fileHigh = file.GetHigh();
+    for (int axis = 0; axis < 3; ++axis) {
+        if (!(low[axis] <= v[axis])) return false;
+        const bool closed = !file.IsEmpty() && high[axis] == fileHigh[axis];
+        if (closed ? !(v[axis] <= high[axis]) : !(v[axis] < high[axis])) return false;
+    }
+    return true;
+}
+
+namespace {
+template <class T>
+void ResizeOrThrow(std::vector<T>& v, std::size_t n)
+{
+    try {
+        v.resize(n);
+    } catch (const std::bad_alloc&) {
+        ZonCloudOperErrorTool::ThrowInsufficientMemory();
+    } catch (const std::length_error&) {
+        ZonCloudOperErrorTool::ThrowInsufficientMemory();
+    }
+}
+}  // namespace
+
+template <class T>
+const T* ZonCloudReadFile::PointsInBox(const ZonMathBox& box, unsigned& count, const T* points, unsigned n,
+                                       std::vector<T>& cache, bool& hasCache)
+{
+    ZonMathBox fileBox;
+    GetBoundingBox(fileBox);
+    if (points && box.IsSameAs(fileBox)) {
+        count = n;
+        return points;
+    }
+    if (hasCache) {
+        if (!_cachedBoxEmpty && box.IsSameAs(_cachedBox)) {
+            count = _cachedCount;
+            return cache.data();
+        }
+        ClearBoxCaches();
+    }
+    count = _cachedCount;
+    if (!points || n == 0 || !box.Intersects(fileBox, 0.0)) return hasCache ? cache.data() : nullptr;
+
+    _cachedBox = box;
+    _cachedBoxEmpty = false;
+    ResizeOrThrow(cache, 3 * static_cast<std::size_t>(n));
+    hasCache = true;
+    std::size_t kept = 0;
+    for (unsigned i = 0; i < n; ++i) {
+        const T* p = points + 3 * static_cast<std::size_t>(i);
+        if (!IsInQueryBox(p[0], p[1], p[2], box, fileBox)) continue;
+        cache[3 * kept] = p[0];
+        cache[3 * kept + 1] = p[1];
+        cache[3 * kept + 2] = p[2];
+        ++kept;
+    }
+    _cachedCount = static_cast<unsigned>(kept);
+    count = _cachedCount;
+    return cache.data();
+}
+
+const float* ZonCloudReadFile::GetPointsInBox(const ZonMathBox& box, unsigned& count)
+{
+    count = 0;
+    unsigned n = 0;
+    const float* points = GetPoints(n);
+    return PointsInBox(box, count, points, n, _cachedPoints, _hasCachedPoints);
+}
+
+const double* ZonCloudReadFile::GetPointsInBoxDouble(const ZonMathBox& box, unsigned& count)
+{
+    count = 0;
+    unsigned n = 0;
+    const double* points = GetPointsDouble(n);
+    return PointsInBox(box, count, points, n, _cachedPointsDouble, _hasCachedPointsDouble);
+}
+
+template <class T>
+const T* ZonCloudReadFile::ScanPointsInBox(const ZonMathBox& box, unsigned& count, const T* points, unsigned n,
+                                           std::vector<T>& cache, bool& hasCache)
+{
+    count = 0;
+    if (!points || n == 0) return nullptr;
+    ZonMathBox fileBox;
+    GetBoundingBox(fileBox);
+    ResizeOrThrow(cache, 3 * static_cast<std::size_t>(n));
+    hasCache = true;
+    std::size_t kept = 0;
+    for (unsigned i = 0; i < n; ++i) {
+        const T* p = points + 3 * static_cast<std::size_t>(i);
+        if (!IsInQueryBox(p[0], p[1], p[2], box, fileBox)) continue;
+        cache[3 * kept] = p[0];
+        cache[3 * kept + 1] = p[1];
+        cache[3 * kept + 2] = p[2];
+        ++kept;
+    }
+    if (kept == 0) {
+        ClearBoxCaches();
+        return nullptr;
+    }
+    _cachedCount = static_cast<unsigned>(kept);
+    count = _cachedCount;
+    return cache.data();
+}
+
+const float* ZonCloudReadFile::GetScanPointsInBox(const ZonMathBox& box, unsigned& count)
+{
+    if (!IsTypeOfDigitization(DigitizationScans))
+        ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Usage, "ERR_NotAScanDigit");
+    // Scan results are never reused: the same box means another scan next time.
+    ClearBoxCaches();
+    unsigned n = 0;
+    const float* points = GetScanPoints(n);
+    return ScanPointsInBox(box, count, points, n, _cachedPoints, _hasCachedPoints);
+}
+
+const double* ZonCloudReadFile::GetScanPointsInBoxDouble(const ZonMathBox& box, unsigned& count)
+{
+    if (!IsTypeOfDigitization(DigitizationScans))
+        ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Usage, "ERR_NotAScanDigit");
+    ClearBoxCaches();
+    unsigned n = 0;
+    const double* points = GetScanPointsDouble(n);
+    return ScanPointsInBox(box, count, points, n, _cachedPointsDouble, _hasCachedPointsDouble);
+}
+
+template <class T, class Get>
+const T* ZonCloudReadFile::GridPointsInBox(const ZonMathBox& box, unsigned& count, const unsigned char*& valid,
+                                           Get get)
+{
+    if (!IsTypeOfDigitization(DigitizationGrids))
+        ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Usage, "ERR_NotAGridDigit");
+    _cachedValidity.clear();
+    _cachedValidity.shrink_to_fit();
+    ZonMathBox fileBox;
+    GetBoundingBox(fileBox);
+    for (;;) {
+        unsigned n = 0;
+        const unsigned char* gridValid = nullptr;
+        const T* points = get(n, gridValid);
+        if (!points) {
+            count = 0;
+            valid = nullptr;
+            return nullptr;
+        }
+        if (n == 0) continue;  // empty rows are skipped until content or the end
+        ResizeOrThrow(_cachedValidity, n);
+        for (unsigned i = 0; i < n; ++i) {
+            const T* p = points + 3 * static_cast<std::size_t>(i);
+            const bool wasValid = gridValid == nullptr || gridValid[i] != 0;
+            _cachedValidity[i] = wasValid && IsInQueryBox(p[0], p[1], p[2], box, fileBox) ? 1 : 0;
+        }
+        count = n;
+        valid = _cachedValidity.data();
+        return points;
+    }
+}
+
+const float* ZonCloudReadFile::GetGridPointsInBox(const ZonMathBox& box, unsigned& count,
+                                                  const unsigned char*& valid)
+{
+    return GridPointsInBox<float>(box, count, valid, [this](unsigned& n, const unsigned char*& v) {
+        return GetGridPoints(n, v);
+    });
+}
+
+const double* ZonCloudReadFile::GetGridPointsInBoxDouble(const ZonMathBox& box, unsigned& count,
+                                                         const unsigned char*& valid)
+{
+    return GridPointsInBox<double>(box, count, valid, [this](unsigned& n, const unsigned char*& v) {
+        return GetGridPointsDouble(n, v);
+    });
+}
+
+void ZonCloudReadFile::OpenFile()
+{
+    CloseFile();
+    errno = 0;
+    _file = std::fopen(_fileName.c_str(), "rb");
+    if (!_file) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, nullptr);
+    // A directory opens as a stream on this system; refuse it as the open would elsewhere.
+    struct stat info {};
+    if (fstat(fileno(_file), &info) == 0 && S_ISDIR(info.st_mode)) {
+        CloseFile();
+        errno = EISDIR;
+        ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, nullptr);
+    }
+}
+
+void ZonCloudReadFile::RewindFile()
+{
+    errno = 0;
+    if (!_file || std::fseek(_file, 0, SEEK_SET) != 0) {
+        if (errno == 0) errno = EBADF;
+        ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Input, nullptr);
+    }
+}
+
+void ZonCloudReadFile::CloseFile()
+{
+    if (_file) std::fclose(_file);
+    _file = nullptr;
+}
+
+void ZonCloudReadFile::ClearBoxCaches()
+{
+    _cachedBox.SetToEmpty();
+    _cachedBoxEmpty = true;
+    _cachedCount = 0;
+    _cachedPoints.clear();
+    _cachedPoints.shrink_to_fit();
+    _cachedPointsDouble.clear();
+    _cachedPointsDouble.shrink_to_fit();
+    _cachedValidity.clear();
+    _cachedValidity.shrink_to_fit();
+    _hasCachedPoints = false;
+    _hasCachedPointsDouble = false;
+}

@@ -1,0 +1,3 @@
+#include "ZonBaseUnknown.h"
+
+ZonBaseUnknown::~ZonBaseUnknown() = default;

@@ -1,0 +1,3 @@
+#include "ZonError.h"
+
+ZonCloudOperError::~ZonCloudOperError() = default;

@@ -1,0 +1,3 @@
+#include "ZonIReporter.h"
+
+ZonIReporter::~ZonIReporter() = default;

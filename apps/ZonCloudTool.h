@@ -1,0 +1,47 @@
+#pragma once
+#include <array>
+#include <optional>
+#include <string>
+#include <vector>
+
+#include <CLI/CLI.hpp>
+#include <nlohmann/json.hpp>
+
+#include "ZonError.h"
+#include "ZonICloudReadFile.h"
+
+// Reader options shared by the commands that read a file. Format options reach
+// the readers through the settings store, as in the interactive import.
+struct ZonToolReaderOptions {
+    std::string file;
+    std::string format;  // skips the choice by extension
+    std::optional<double> sampling;
+    bool doublePrecision = false;
+    std::vector<std::string> delimiters;  // begin, end
+    std::optional<int> direction;
+    std::vector<double> box;  // xmin ymin zmin xmax ymax zmax
+    std::string byteOrder;    // unknown | current | differ
+    std::string fdf;
+    bool noColors = false;
+    bool noTriangles = false;
+
+    void AddTo(CLI::App& command);
+    // Writes the options into the settings store.
+    void ApplyToSettings() const;
+    bool HasBox() const { return box.size() == 6; }
+    ZonMathBox Box() const;
+    // Creates the reader: by --format when given, else by the file's extension.
+    ZonICloudReadFile_var CreateReader(std::string& formatName) const;
+};
+
+// Writes numbers so that they read back to the same float or double.
+nlohmann::json ZonToolNumber(float value);
+nlohmann::json ZonToolNumber(double value);
+nlohmann::json ZonToolErrorJson(const ZonError& error);
+
+// Each command adds itself and returns the function that runs it.
+using ZonToolRun = std::function<int()>;
+ZonToolRun ZonToolAddFormats(CLI::App& app);
+ZonToolRun ZonToolAddInfo(CLI::App& app);
+ZonToolRun ZonToolAddDump(CLI::App& app);
+ZonToolRun ZonToolAddConvert(CLI::App& app);

@@ -1,0 +1,89 @@
+#include <charconv>
+#include <cmath>
+
+#include "ZonCldImportServices.h"
+#include "ZonCldImporter.h"
+#include "ZonCldSettings.h"
+#include "ZonCloudReadNLSTool.h"
+#include "ZonCloudTool.h"
+
+void ZonToolReaderOptions::AddTo(CLI::App& command)
+{
+    command.add_option("FILE", file, "File to read")->required();
+    command.add_option("--format", format, "Format name (skips the choice by extension)");
+    command.add_option("--sampling", sampling, "Sampling percent, 0 to 100");
+    command.add_flag("--double", doublePrecision, "Read in double precision");
+    command.add_option("--delimiters", delimiters, "Begin and end scan delimiters")->expected(2);
+    command.add_option("--direction", direction, "Scan direction: 0 unknown, 1 one way, 2 zigzag");
+    command.add_option("--box", box, "XMIN YMIN ZMIN XMAX YMAX ZMAX")->expected(6);
+    command.add_option("--byte-order", byteOrder, "Byte order of binary files")
+        ->check(CLI::IsMember({"unknown", "current", "differ"}));
+    command.add_option("--fdf", fdf, "Format description file");
+    command.add_flag("--no-colors", noColors, "Do not keep the points' colours");
+    command.add_flag("--no-triangles", noTriangles, "Import the vertices of meshes only");
+}
+
+void ZonToolReaderOptions::ApplyToSettings() const
+{
+    auto& settings = ZonCldSettings::Instance();
+    if (sampling) settings.SetImportSampling(*sampling);
+    settings.SetImportDoublePrecision(doublePrecision);
+    if (delimiters.size() == 2) {
+        settings.SetValue("StartDelimitor", delimiters[0]);
+        settings.SetValue("EndDelimitor", delimiters[1]);
+    }
+    if (direction) settings.SetInt("ScanDirection", *direction);
+    if (!byteOrder.empty())
+        settings.SetInt("BinaryFrom", byteOrder == "unknown" ? 0 : byteOrder == "current" ? 1 : 2);
+    if (!fdf.empty()) settings.SetImportAUFFDF(fdf);
+    if (noColors) settings.SetBool("KeepColors", false);
+    if (noTriangles) {
+        settings.SetImportSTLFacets(false);
+        settings.SetImportGoCadFacets(false);
+        settings.SetImportArcInfoGridFacets(false);
+        settings.SetImportSRTMFacets(false);
+        settings.SetBool("CreateTriangles", false);
+    }
+}
+
+ZonMathBox ZonToolReaderOptions::Box() const
+{
+    return ZonMathBox(box[0], box[3], box[1], box[4], box[2], box[5]);
+}
+
+ZonICloudReadFile_var ZonToolReaderOptions::CreateReader(std::string& formatName) const
+{
+    ZonUnicodeString name(format);
+    if (format.empty()) name = ZonCldImportServices::FindFormatOfFile(ZonUnicodeString(file));
+    ZonCldImporter importer(name);
+    if (!importer.GetFactory()) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Input, "ERR_UnknownExtension");
+    formatName = name.ToUtf8();
+    ZonICloudReadFile_var reader = importer.CreateReader(ZonUnicodeString(file));
+    if (!reader) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Input, "ERR_Failure");
+    reader->SetSamplingPercent(static_cast<float>(ZonCldSettings::Instance().GetImportSampling()));
+    reader->SetDoublePrecision(doublePrecision);
+    return reader;
+}
+
+namespace {
+// Shortest text that reads back to the same value; JSON has no NaN or infinity.
+template <class T>
+nlohmann::json Number(T value)
+{
+    if (!std::isfinite(value)) return nullptr;
+    char buffer[64];
+    const auto [end, ec] = std::to_chars(buffer, buffer + sizeof buffer, value);
+    return nlohmann::json::parse(std::string_view(buffer, static_cast<std::size_t>(end - buffer)));
+}
+}  // namespace
+
+nlohmann::json ZonToolNumber(float value) { return Number(value); }
+nlohmann::json ZonToolNumber(double value) { return Number(value); }
+
+nlohmann::json ZonToolErrorJson(const ZonError& error)
+{
+    return {{"catalog", error.GetCatalogName()},
+            {"key", error.GetMessageKey()},
+            {"severity", error.GetSeverity()},
+            {"message", error.GetNLSMessage()}};
+}
