@@ -1,0 +1,86 @@
+// Host stand-in services the module relies on.
+#include <gtest/gtest.h>
+
+#include "ZonCldSettings.h"
+#include "ZonError.h"
+#include "ZonICkeUnit.h"
+#include "ZonMath.h"
+#include "ZonObjectRegistry.h"
+#include "ZonUnicodeString.h"
+
+namespace {
+
+TEST(HostMath, TransformationInverseAndIdentity)
+{
+    EXPECT_TRUE(ZonMathTransformation().IsIdentity());
+    const ZonMathTransformation t({0, -2, 0, 1, 0, 0, 0, 0, 3}, {5, -1, 2});
+    EXPECT_FALSE(t.IsIdentity());
+    const ZonMathTransformation inverse = t.ComputeInverse();
+    const ZonMathPoint p(1.5, -2.0, 7.0);
+    const ZonMathPoint back = inverse.Apply(t.Apply(p));
+    EXPECT_NEAR(back.DistanceTo(p), 0.0, 1e-12);
+    EXPECT_TRUE((inverse * t).IsIdentity());
+    EXPECT_THROW(ZonMathTransformation({1, 2, 3, 2, 4, 6, 0, 0, 1}, {0, 0, 0}).ComputeInverse(), ZonError);
+}
+
+TEST(HostMath, BoxIntersectionAndSameness)
+{
+    ZonMathBox empty;
+    EXPECT_TRUE(empty.IsEmpty());
+    ZonMathBox a(0, 1, 0, 1, 0, 1);
+    EXPECT_TRUE(a.Intersects(ZonMathBox(1, 2, 1, 2, 1, 2)));  // touching faces meet
+    EXPECT_FALSE(a.Intersects(ZonMathBox(1.5, 2, 0, 1, 0, 1)));
+    EXPECT_TRUE(a.Intersects(ZonMathBox(1.5, 2, 0, 1, 0, 1), 0.5));
+    EXPECT_FALSE(a.Intersects(empty));
+    EXPECT_TRUE(a.IsSameAs(ZonMathBox(0, 1, 0, 1, 0, 1)));
+    EXPECT_FALSE(a.IsSameAs(ZonMathBox(0, 1, 0, 1, 0, 1.0000001)));
+    empty.AddPoint(3, -1, 2);
+    empty.AddPoint(-3, 1, 0);
+    EXPECT_TRUE(empty.IsSameAs(ZonMathBox(-3, 3, -1, 1, 0, 2)));
+}
+
+TEST(HostRegistry, ImplementersAreListedInAStableOrderAndCreatedByName)
+{
+    struct Thing : ZonBaseUnknown {};
+    ZonObjectRegistry::Register("ThingB", "ITestThing", [] { return std::make_shared<Thing>(); });
+    ZonObjectRegistry::Register("ThingA", "ITestThing", [] { return std::make_shared<Thing>(); });
+    ZonObjectRegistry::Register("ThingA", "ITestThing", [] { return std::make_shared<Thing>(); });
+    EXPECT_EQ(ZonObjectRegistry::ListImplementations("ITestThing"), (std::vector<std::string>{"ThingA", "ThingB"}));
+    EXPECT_NE(ZonObjectRegistry::CreateByLateType("ThingB"), nullptr);
+    EXPECT_EQ(ZonObjectRegistry::CreateByLateType("NoSuchThing"), nullptr);
+    EXPECT_FALSE(ZonObjectRegistry::IsInterfaceKnown("INoSuchInterface"));
+}
+
+TEST(HostSettings, DefaultsTypedValuesAndReset)
+{
+    auto& settings = ZonCldSettings::Instance();
+    settings.ResetAll();
+    EXPECT_EQ(settings.GetImportScaleFactor(), 1.0);
+    EXPECT_EQ(settings.GetImportSampling(), 100.0);
+    EXPECT_EQ(settings.GetImportFileUnit(), "mm");
+    EXPECT_TRUE(settings.GetImportSTLFacets());
+    settings.SetImportSampling(12.5);
+    settings.SetImportSTLFacets(false);
+    settings.SetValue("ScanDirection", "junk");
+    EXPECT_EQ(settings.GetImportSampling(), 12.5);
+    EXPECT_FALSE(settings.GetImportSTLFacets());
+    EXPECT_EQ(settings.GetInt("ScanDirection", 7), 7);
+    settings.ResetAll();
+    EXPECT_TRUE(settings.GetImportSTLFacets());
+    auto& preferences = ZonPreferenceRepository::Get("ImportOptions");
+    preferences.WritePreference("CreateTriangles", "1");
+    EXPECT_EQ(ZonPreferenceRepository::Get("ImportOptions").ReadPreference("CreateTriangles"), "1");
+    preferences.Clear();
+}
+
+TEST(HostText, UnitsAndStrings)
+{
+    ASSERT_NE(ZonICkeUnit::FromName("inch"), nullptr);
+    EXPECT_EQ(ZonICkeUnit::FromName("INCH")->ToMillimetres(), 25.4);
+    EXPECT_EQ(ZonICkeUnit::FromName("furlong"), nullptr);
+    const ZonUnicodeString path("/Data/Scan.ASC");
+    EXPECT_EQ(path.SearchBackward('.'), 10);
+    EXPECT_EQ(path.SubString(10).ToLower().ToUtf8(), ".asc");
+}
+
+}  // namespace
