@@ -4,6 +4,7 @@
 #include "ZonICloudReadGridFile.h"
 #include "ZonICloudReadOptDelimitor.h"
 #include "ZonICloudReadOptDirection.h"
+#include "ZonICloudReadOptTriangles.h"
 #include "ZonICloudReadPolygonFile.h"
 #include "ZonICloudReadScanFile.h"
 
@@ -14,6 +15,7 @@ ZonICloudReadPolygonFile::~ZonICloudReadPolygonFile() = default;
 ZonICloudReadFileFactory::~ZonICloudReadFileFactory() = default;
 ZonICloudReadOptDelimitor::~ZonICloudReadOptDelimitor() = default;
 ZonICloudReadOptDirection::~ZonICloudReadOptDirection() = default;
+ZonICloudReadOptTriangles::~ZonICloudReadOptTriangles() = default;
 
 ZonOptionFrame* ZonICloudReadFileFactory::GetOptions(ZonDialog*, ZonNotification*& notification)
 {
