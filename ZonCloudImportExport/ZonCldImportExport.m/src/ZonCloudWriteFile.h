@@ -1,0 +1,57 @@
+#pragma once
+#include <cstdint>
+#include <cstdio>
+
+#include "ZonBaseUnknown.h"
+#include "ZonCldExport.h"
+#include "ZonICloudWriteFile.h"
+
+// Base of every writer: the file name, the output stream it owns (closed by
+// the destructor at the latest), the multi-part flag and the byte order of
+// binary output. Text goes through Print, which writes '.' as decimal point
+// whatever the process locale, so files read back everywhere.
+class ZON_CLD_API ZonCloudWriteFile : public ZonBaseUnknown, public ZonICloudWriteFile {
+public:
+    explicit ZonCloudWriteFile(const ZonUnicodeString& fileName);
+    ~ZonCloudWriteFile() override;
+    ZonCloudWriteFile(const ZonCloudWriteFile&) = delete;
+    ZonCloudWriteFile& operator=(const ZonCloudWriteFile&) = delete;
+
+    // ZonICloudWriteFile
+    void GetFileName(ZonUnicodeString& name) override;
+    void SetWriteSettings(const ZonListValZonString&) override {}
+    void GetWriteSettings(ZonListValZonString&) override {}
+    // By default a multi-part file is simply kept open between the pieces;
+    // writers whose headers carry totals complete them in EndMultiWrite.
+    ZonHResult BeginMultiWrite() override;
+    ZonHResult EndMultiWrite() override;
+    void SetReverseByteOrder(bool reversed) override { _reverseBytes = reversed; }
+
+    bool IsMultiWrite() const { return _multiWrite; }
+    bool IsReverseByteOrder() const { return _reverseBytes; }
+
+protected:
+    // Closes any open stream and opens the file with mode; a failure raises
+    // type 3 with the errno message.
+    void OpenStream(const char* mode);
+    // The same without raising: false when the file cannot be opened.
+    bool TryOpenStream(const char* mode);
+    void CloseStream();
+
+    // fprintf to the stream with '.' as decimal point. Individual lines are
+    // not checked: a full disk shows when the stream is closed.
+    void Print(const char* format, ...) __attribute__((format(printf, 2, 3)));
+
+    // Binary output, every write checked (type 3 with the errno message).
+    void WriteBytes(const void* data, std::size_t size);
+    // 32-bit values in the writer's byte order (little-endian, or reversed).
+    void WriteUInt32(std::uint32_t value);
+    void WriteFloat32(float value);
+    std::uint32_t ReadUInt32();
+    void Seek(long offset, int whence);
+
+    ZonUnicodeString _fileName;
+    FILE* _file = nullptr;
+    bool _multiWrite = false;
+    bool _reverseBytes = false;
+};
