@@ -29,7 +29,9 @@ public:
     virtual bool IsDoublePrecision() = 0;
     // R, G, B per point, 0 to 255.
     virtual const unsigned char* GetPointColors(unsigned& count) = 0;
-    // Format-specific per-point arrays; their element type is the format's.
+    // Format-specific per-point arrays, one entry per point of GetPoints when
+    // given. The importer reads them as: 1 alpha, 2 symbol index (one
+    // std::int32_t per point each), 3 text (one std::string per point).
     virtual const void* GetPointAttributes1(unsigned& count) = 0;
     virtual const void* GetPointAttributes2(unsigned& count) = 0;
     virtual const void* GetPointAttributes3(unsigned& count) = 0;
