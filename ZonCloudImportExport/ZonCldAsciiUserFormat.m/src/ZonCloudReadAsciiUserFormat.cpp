@@ -1,0 +1,488 @@
+#include "ZonCloudReadAsciiUserFormat.h"
+
+#include <algorithm>
+#include <array>
+#include <cerrno>
+#include <cmath>
+#include <cstring>
+#include <limits>
+#include <new>
+#include <stdexcept>
+
+#include "ZonCloudOperErrorTool.h"
+#include "ZonCloudReadNLSTool.h"
+#include "ZonCloudScanFormat.h"
+
+namespace {
+
+constexpr std::array<std::string_view, 15> Vocabulary = {
+    "X", "Y", "Z", "DX", "DY", "DZ", "R", "G", "B", "A", "COLOR", "SYMBOL", "LABEL", "TEXT", "USELESS_INFO"};
+
+// R, G, B of the COLOR column's eight entries (their alpha is always 255).
+constexpr unsigned char Palette[8][3] = {{0, 0, 0},     {255, 255, 255}, {255, 0, 0},   {0, 255, 0},
+                                         {0, 0, 255},   {255, 255, 0},   {255, 0, 255}, {0, 255, 255}};
+
+constexpr int DataLineSize = 512;  // lines of at most 511 characters
+constexpr int FdfLineSize = 255;   // the FDF line: at most 254 characters
+constexpr int SampleLines = 20;    // lines read to estimate the number of points
+constexpr std::uint64_t GrowthStep = 8192;
+constexpr int MaxTokens = DataLineSize / 2 + 1;
+
+bool IsSeparator(char c) { return c == ' ' || c == '\t' || c == '\r' || c == '\n' || c == '\v' || c == '\f'; }
+
+// Cuts the line at the character before its first newline: that removes the
+// CR of a CR LF line, and on a line ended by LF alone it eats the last
+// character of the last word. Files have always been read this way.
+void CutBeforeNewline(char* line)
+{
+    char* newline = std::strchr(line, '\n');
+    if (newline && newline > line) newline[-1] = '\0';
+}
+
+// Splits in place, as strtok would: each token ends with a NUL.
+int Tokenize(char* line, char* tokens[], int maxTokens)
+{
+    int n = 0;
+    char* p = line;
+    while (*p && n < maxTokens) {
+        while (*p && IsSeparator(*p)) ++p;
+        if (!*p) break;
+        tokens[n++] = p;
+        while (*p && !IsSeparator(*p)) ++p;
+        if (*p) *p++ = '\0';
+    }
+    return n;
+}
+
+template <class T>
+void ReserveOrThrow(std::vector<T>& v, std::uint64_t n)
+{
+    try {
+        if (n > v.max_size()) ZonCloudOperErrorTool::ThrowInsufficientMemory();
+        v.reserve(static_cast<std::size_t>(n));
+    } catch (const std::bad_alloc&) {
+        ZonCloudOperErrorTool::ThrowInsufficientMemory();
+    } catch (const std::length_error&) {
+        ZonCloudOperErrorTool::ThrowInsufficientMemory();
+    }
+}
+
+// Closes the reader's file however the load ends.
+template <class Close>
+struct ScopeExit {
+    Close close;
+    ~ScopeExit() { close(); }
+};
+template <class Close>
+ScopeExit(Close) -> ScopeExit<Close>;
+
+}  // namespace
+
+// The values one data line gives; the colour and symbol indices live in the
+// reader because a line without those columns inherits them.
+struct ZonCloudReadAsciiUserFormat::LineValues {
+    double x = 0.0, y = 0.0, z = 0.0;
+    std::int32_t r = 0, g = 255, b = 0, a = 255;
+    int colorCounter = 0;
+    std::string text;
+};
+
+int ZonCloudReadAsciiUserFormat::FieldCodeOf(std::string_view word)
+{
+    for (std::size_t i = 0; i < Vocabulary.size(); ++i)
+        if (Vocabulary[i] == word) return static_cast<int>(i) + 1;
+    return 0;
+}
+
+ZonCloudReadAsciiUserFormat::ZonCloudReadAsciiUserFormat(const ZonUnicodeString& fileName)
+    : ZonCloudReadFile(fileName)
+{
+    _digitizationType = DigitizationCloud;
+    ReadFDF();
+}
+
+void ZonCloudReadAsciiUserFormat::SetFDFile(const ZonUnicodeString& path)
+{
+    if (path == _fdfPath) return;
+    _fdfPath = path;
+    ReadFDF();
+    Discard();
+}
+
+void ZonCloudReadAsciiUserFormat::GetFDFile(ZonUnicodeString& path) { path = _fdfPath; }
+
+void ZonCloudReadAsciiUserFormat::SetKeepColors(bool keep)
+{
+    if (keep == _keepColors) return;
+    _keepColors = keep;
+    Discard();
+}
+
+bool ZonCloudReadAsciiUserFormat::GetKeepColors() { return _hasColor; }
+
+void ZonCloudReadAsciiUserFormat::SetSamplingPercent(float percent)
+{
+    const float before = _samplingPercent;
+    ZonCloudReadFile::SetSamplingPercent(percent);
+    if (_samplingPercent != before) Discard();
+}
+
+void ZonCloudReadAsciiUserFormat::ReadFDF()
+{
+    // The first FDF fixes the columns for the life of the reader.
+    if (_fdfRead || _fdfPath.IsNull()) return;
+    errno = 0;
+    FILE* fdf = std::fopen(_fdfPath.c_str(), "rb");
+    if (!fdf) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, nullptr);
+    ScopeExit closer{[fdf] { std::fclose(fdf); }};
+
+    char line[FdfLineSize] = {};
+    if (!std::fgets(line, sizeof line, fdf)) {
+        if (std::ferror(fdf)) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Input, nullptr);
+        line[0] = '\0';
+    }
+    CutBeforeNewline(line);
+
+    // Words that are not keywords take no column.
+    _fields.clear();
+    char* tokens[FdfLineSize];
+    const int n = Tokenize(line, tokens, FdfLineSize);
+    for (int i = 0; i < n; ++i) {
+        const int code = FieldCodeOf(tokens[i]);
+        if (code != 0) _fields.push_back(code);
+    }
+    _fieldsHaveColor = _fieldsHaveAlpha = _fieldsHaveSymbol = _fieldsHaveText = false;
+    for (const int code : _fields) {
+        _fieldsHaveColor |= code == FieldR || code == FieldG || code == FieldB || code == FieldColor;
+        _fieldsHaveAlpha |= code == FieldA;
+        _fieldsHaveSymbol |= code == FieldSymbol;
+        _fieldsHaveText |= code == FieldText;
+    }
+    _fdfRead = true;
+}
+
+void ZonCloudReadAsciiUserFormat::Discard()
+{
+    _points.clear();
+    _points.shrink_to_fit();
+    _pointsDouble.clear();
+    _pointsDouble.shrink_to_fit();
+    _colors.clear();
+    _colors.shrink_to_fit();
+    _alphas.clear();
+    _alphas.shrink_to_fit();
+    _symbols.clear();
+    _symbols.shrink_to_fit();
+    _texts.clear();
+    _texts.shrink_to_fit();
+    _count = 0;
+    _capacity = 0;
+    _hasColor = _hasAlpha = _hasSymbol = _hasText = false;
+    _completeLines = 0;
+    _numberOfPoints = 0;
+    _boundingBox.SetToEmpty();
+    _analysed = false;
+    ClearBoxCaches();
+}
+
+void ZonCloudReadAsciiUserFormat::Analyse()
+{
+    if (_analysed || !_fdfRead) return;
+    Load(_doublePrecision);
+}
+
+bool ZonCloudReadAsciiUserFormat::Prepare(bool wantDouble)
+{
+    if (!_fdfRead) return false;
+    // Doubles cannot be recovered from floats: a double request reloads.
+    if (!_analysed || (wantDouble && !_loadedAsDouble)) Load(wantDouble || _doublePrecision);
+    if (_completeLines <= 0) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_NoPointFound");
+    return true;
+}
+
+std::uint64_t ZonCloudReadAsciiUserFormat::EstimateCapacity(std::uint64_t fileSize)
+{
+    char line[DataLineSize];
+    std::uint64_t lines = 0;
+    long offset = 0;
+    while (lines < SampleLines && std::fgets(line, sizeof line, _file)) {
+        ++lines;
+        offset = std::ftell(_file);
+    }
+    std::clearerr(_file);
+    RewindFile();
+    if (lines == 0 || offset <= 0) return 0;
+    const std::uint64_t average = static_cast<std::uint64_t>(offset) / lines;
+    if (average == 0) return 0;
+    // A complete line holds one token per column and a separator between
+    // them, so no file has more points than this; the estimate never asks
+    // for more room than the file can fill.
+    const std::uint64_t columns = _fields.empty() ? 1 : _fields.size();
+    const std::uint64_t mostPoints = fileSize / (2 * columns - 1) + 1;
+    return std::min(fileSize / average + 1, mostPoints);
+}
+
+void ZonCloudReadAsciiUserFormat::Load(bool asDouble)
+{
+    Discard();
+    _loadedAsDouble = asDouble;
+    OpenFile();
+    ScopeExit closer{[this] { CloseFile(); }};
+    std::setvbuf(_file, nullptr, _IOFBF, 1 << 20);
+
+    _completeLines = 0;
+    _dataStart = 0;
+    // The product k * r is taken in double precision from the float ratio.
+    const double ratio = static_cast<float>(_samplingPercent / 100.0f);
+
+    errno = 0;
+    if (std::fseek(_file, 0, SEEK_END) != 0) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Input, nullptr);
+    const long size = std::ftell(_file);
+    if (size < 0) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Input, nullptr);
+    RewindFile();
+    _estimate = EstimateCapacity(static_cast<std::uint64_t>(size));
+
+    _colorIndex = 3;
+    _symbolIndex = 0;
+    double previousWhole = 1.0;
+    ZonMathBox box;
+    LineValues values;
+    char line[DataLineSize];
+    while (std::fgets(line, sizeof line, _file)) {
+        bool complete = false;
+        ParseLine(line, values, complete);
+        if (!complete) {
+            if (_completeLines == 0) {
+                _dataStart = std::ftell(_file);
+                if (_dataStart < 0) {
+                    _dataStart = 0;
+                    std::clearerr(_file);
+                }
+            }
+            continue;
+        }
+        const auto above255 = [](std::int32_t v) { return static_cast<std::uint32_t>(v) > 255u; };
+        if (above255(values.r) || above255(values.g) || above255(values.b) || above255(values.a))
+            ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_RGBColorOutOfRange");
+        if (static_cast<std::uint32_t>(_colorIndex) > 7u)
+            ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_ColorIndexOutOfRange");
+        if (values.colorCounter == 4) {
+            // COLOR was the line's last colour column: the palette wins.
+            values.r = Palette[_colorIndex][0];
+            values.g = Palette[_colorIndex][1];
+            values.b = Palette[_colorIndex][2];
+            values.a = 255;
+        }
+        if (static_cast<std::uint32_t>(_symbolIndex) > 8u)
+            ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_SymbolIndexOutOfRange");
+        if (_keepColors && (values.colorCounter == 3 || values.colorCounter == 4)) _hasColor = true;
+
+        const double before = static_cast<double>(_completeLines);
+        ++_completeLines;
+        box.AddPoint(values.x, values.y, values.z);
+        const double whole = std::trunc(before * ratio);
+        if (whole == previousWhole) continue;
+        previousWhole = whole;
+        StorePoint(values);
+    }
+    if (std::ferror(_file)) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Input, nullptr);
+
+    if (_completeLines > 0) _boundingBox = box;
+    _numberOfPoints = static_cast<int>(std::min<std::int64_t>(_completeLines, std::numeric_limits<int>::max()));
+    if (_completeLines == 0) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_NoPointFound");
+    _analysed = true;
+}
+
+void ZonCloudReadAsciiUserFormat::ParseLine(char* line, LineValues& values, bool& complete)
+{
+    static const ZonCloudScanFormat realFormat("%le");
+    static const ZonCloudScanFormat integerFormat("%d");
+
+    values.x = values.y = values.z = 0.0;
+    values.r = 0;
+    values.g = 255;
+    values.b = 0;
+    values.a = 255;
+    values.colorCounter = 0;
+    values.text.clear();
+    complete = false;
+
+    CutBeforeNewline(line);
+    char* tokens[MaxTokens];
+    const int tokenCount = Tokenize(line, tokens, MaxTokens);
+    if (tokenCount == 0 || tokens[0][0] == '!') return;
+
+    const std::size_t fieldCount = _fields.size();
+    std::size_t field = 0;
+    int t = 0;
+    std::string quoted;
+    for (; field < fieldCount && t < tokenCount; ++field, ++t) {
+        char* token = tokens[t];
+        quoted.clear();
+        if (const char* open = std::strchr(token, '"')) {
+            // A quoted text may run over several tokens; those take no column.
+            const char* rest = open + 1;
+            if (const char* close = std::strchr(rest, '"')) {
+                quoted.assign(rest, close);
+            } else {
+                quoted.assign(rest);
+                while (t + 1 < tokenCount) {
+                    const char* next = tokens[++t];
+                    quoted += ' ';
+                    if (const char* end = std::strchr(next, '"')) {
+                        quoted.append(next, end);
+                        break;
+                    }
+                    quoted += next;
+                }
+            }
+        }
+        switch (_fields[field]) {
+            case FieldX:
+            case FieldY:
+            case FieldZ:
+            case FieldDX:
+            case FieldDY:
+            case FieldDZ: {
+                // A decimal comma reads as a point. Parsing with '.' gives what
+                // the locale's own decimal point would after the same swap.
+                for (char* c = token; *c; ++c)
+                    if (*c == ',') *c = '.';
+                double value = 0.0;
+                realFormat(token, '.', &value);
+                const int code = _fields[field];
+                if (code == FieldX) values.x = value;
+                else if (code == FieldY) values.y = value;
+                else if (code == FieldZ) values.z = value;
+                break;
+            }
+            case FieldR:
+                integerFormat(token, '.', &values.r);
+                ++values.colorCounter;
+                break;
+            case FieldG:
+                integerFormat(token, '.', &values.g);
+                ++values.colorCounter;
+                break;
+            case FieldB:
+                integerFormat(token, '.', &values.b);
+                ++values.colorCounter;
+                break;
+            case FieldA:
+                integerFormat(token, '.', &values.a);
+                _hasAlpha = true;
+                break;
+            case FieldColor:
+                integerFormat(token, '.', &_colorIndex);
+                values.colorCounter = 4;
+                break;
+            case FieldSymbol:
+                integerFormat(token, '.', &_symbolIndex);
+                _hasSymbol = true;
+                break;
+            case FieldText:
+                values.text += '/';
+                values.text += quoted;
+                values.text += '%';
+                _hasText = true;
+                break;
+            default:  // LABEL, USELESS_INFO: the column is only consumed
+                break;
+        }
+    }
+    complete = fieldCount > 0 && field == fieldCount;
+}
+
+void ZonCloudReadAsciiUserFormat::Grow()
+{
+    const std::uint64_t capacity = (_capacity == 0 && _estimate != 0) ? _estimate : _capacity + GrowthStep;
+    if (_loadedAsDouble)
+        ReserveOrThrow(_pointsDouble, 3 * capacity);
+    else
+        ReserveOrThrow(_points, 3 * capacity);
+    if (_fieldsHaveColor && _keepColors) ReserveOrThrow(_colors, 3 * capacity);
+    if (_fieldsHaveAlpha) ReserveOrThrow(_alphas, capacity);
+    if (_fieldsHaveSymbol) ReserveOrThrow(_symbols, capacity);
+    if (_fieldsHaveText) ReserveOrThrow(_texts, capacity);
+    _capacity = capacity;
+}
+
+void ZonCloudReadAsciiUserFormat::StorePoint(const LineValues& values)
+{
+    if (_count >= std::numeric_limits<unsigned>::max()) ZonCloudOperErrorTool::ThrowInsufficientMemory();
+    if (_count == _capacity) Grow();
+    if (_loadedAsDouble) {
+        _pointsDouble.push_back(values.x);
+        _pointsDouble.push_back(values.y);
+        _pointsDouble.push_back(values.z);
+    } else {
+        _points.push_back(static_cast<float>(values.x));
+        _points.push_back(static_cast<float>(values.y));
+        _points.push_back(static_cast<float>(values.z));
+    }
+    if (_fieldsHaveColor && _keepColors) {
+        _colors.push_back(static_cast<unsigned char>(values.r));
+        _colors.push_back(static_cast<unsigned char>(values.g));
+        _colors.push_back(static_cast<unsigned char>(values.b));
+    }
+    if (_fieldsHaveAlpha) _alphas.push_back(values.a);
+    if (_fieldsHaveSymbol) _symbols.push_back(_symbolIndex);
+    if (_fieldsHaveText) _texts.push_back(values.text);
+    ++_count;
+}
+
+const float* ZonCloudReadAsciiUserFormat::GetPoints(unsigned& count)
+{
+    count = 0;
+    if (!Prepare(false)) return nullptr;
+    if (_loadedAsDouble && _points.size() != 3 * _count) {
+        // Loaded for doubles: floats are the same values narrowed.
+        try {
+            _points.assign(_pointsDouble.begin(), _pointsDouble.end());
+        } catch (const std::bad_alloc&) {
+            ZonCloudOperErrorTool::ThrowInsufficientMemory();
+        }
+    }
+    count = static_cast<unsigned>(_count);
+    return _points.data();
+}
+
+const double* ZonCloudReadAsciiUserFormat::GetPointsDouble(unsigned& count)
+{
+    count = 0;
+    if (!Prepare(true)) return nullptr;
+    count = static_cast<unsigned>(_count);
+    return _pointsDouble.data();
+}
+
+const unsigned char* ZonCloudReadAsciiUserFormat::GetPointColors(unsigned& count)
+{
+    count = 0;
+    if (!Prepare(false) || !_hasColor) return nullptr;
+    count = static_cast<unsigned>(_count);
+    return _colors.data();
+}
+
+const void* ZonCloudReadAsciiUserFormat::GetPointAttributes1(unsigned& count)
+{
+    count = 0;
+    if (!Prepare(false) || !_hasAlpha) return nullptr;
+    count = static_cast<unsigned>(_count);
+    return _alphas.data();
+}
+
+const void* ZonCloudReadAsciiUserFormat::GetPointAttributes2(unsigned& count)
+{
+    count = 0;
+    if (!Prepare(false) || !_hasSymbol) return nullptr;
+    count = static_cast<unsigned>(_count);
+    return _symbols.data();
+}
+
+const void* ZonCloudReadAsciiUserFormat::GetPointAttributes3(unsigned& count)
+{
+    count = 0;
+    if (!Prepare(false) || !_hasText) return nullptr;
+    count = static_cast<unsigned>(_count);
+    return _texts.data();
+}

@@ -1,0 +1,44 @@
+#include "ZonCloudFactoryLeica.h"
+
+#include <charconv>
+#include <string>
+
+#include "ZonCldSettings.h"
+#include "ZonCloudReadLeica.h"
+
+ZON_REGISTER_CLOUD_FACTORY(ZonCloudFactoryLeica, "CloudFactoryLeica")
+
+ZonCloudFactoryLeica::ZonCloudFactoryLeica()
+    : ZonCloudReadFileFactory({"CloudFactoryLeica", "Ascii RGB", "*.asc_rgb;*.xyz_rgb", true, false, true})
+{
+}
+
+ZonICloudReadFile_var ZonCloudFactoryLeica::CreateReader(const ZonUnicodeString& fileName)
+{
+    auto reader = std::make_shared<ZonCloudReadLeica>(fileName);
+    reader->SetKeepColors(ZonCldSettings::Instance().GetBool(OptionKeepColors, true));
+    return reader;
+}
+
+int ZonCloudFactoryLeica::OptionsToSettings(const ZonListValZonString& keys, const ZonListValZonString& values,
+                                            bool& keepColors)
+{
+    if (keys.size() != values.size()) return Failure;
+    for (std::size_t i = 0; i < keys.size(); ++i) {
+        if (keys[i] != OptionKeepColors) continue;
+        const std::string& text = values[i];
+        int flag = 0;
+        const auto [end, ec] = std::from_chars(text.data(), text.data() + text.size(), flag);
+        if (ec != std::errc() || end == text.data()) return Failure;
+        keepColors = flag != 0;
+        return Success;
+    }
+    return Failure;
+}
+
+int ZonCloudFactoryLeica::SettingsToOptions(bool keepColors, ZonListValZonString& keys, ZonListValZonString& values)
+{
+    keys.assign(1, OptionKeepColors);
+    values.assign(1, std::to_string(keepColors ? 1 : 0));
+    return Success;
+}
