@@ -30,6 +30,8 @@ struct ZonToolReaderOptions {
     void ApplyToSettings() const;
     bool HasBox() const { return box.size() == 6; }
     ZonMathBox Box() const;
+    // --format when given, else the format that claims the file's extension.
+    std::string FormatName() const;
     // Creates the reader: by --format when given, else by the file's extension.
     ZonICloudReadFile_var CreateReader(std::string& formatName) const;
 };

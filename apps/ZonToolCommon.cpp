@@ -10,7 +10,13 @@
 void ZonToolReaderOptions::AddTo(CLI::App& command)
 {
     command.add_option("FILE", file, "File to read")->required();
-    command.add_option("--format", format, "Format name (skips the choice by extension)");
+    command.add_option("--format", format, "Format name (skips the choice by extension)")
+        ->check(
+            [](const std::string& name) {
+                return ZonCldImporter::GetFactory(ZonUnicodeString(name)) ? std::string()
+                                                                         : "no format is named " + name;
+            },
+            "FORMAT");
     command.add_option("--sampling", sampling, "Sampling percent, 0 to 100");
     command.add_flag("--double", doublePrecision, "Read in double precision");
     command.add_option("--delimiters", delimiters, "Begin and end scan delimiters")->expected(2);
@@ -51,13 +57,17 @@ ZonMathBox ZonToolReaderOptions::Box() const
     return ZonMathBox(box[0], box[3], box[1], box[4], box[2], box[5]);
 }
 
+std::string ZonToolReaderOptions::FormatName() const
+{
+    if (!format.empty()) return format;
+    return ZonCldImportServices::FindFormatOfFile(ZonUnicodeString(file)).ToUtf8();
+}
+
 ZonICloudReadFile_var ZonToolReaderOptions::CreateReader(std::string& formatName) const
 {
-    ZonUnicodeString name(format);
-    if (format.empty()) name = ZonCldImportServices::FindFormatOfFile(ZonUnicodeString(file));
-    ZonCldImporter importer(name);
+    formatName = FormatName();
+    ZonCldImporter importer{ZonUnicodeString(formatName)};
     if (!importer.GetFactory()) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Input, "ERR_UnknownExtension");
-    formatName = name.ToUtf8();
     ZonICloudReadFile_var reader = importer.CreateReader(ZonUnicodeString(file));
     if (!reader) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Input, "ERR_Failure");
     reader->SetSamplingPercent(static_cast<float>(ZonCldSettings::Instance().GetImportSampling()));
@@ -65,20 +75,21 @@ ZonICloudReadFile_var ZonToolReaderOptions::CreateReader(std::string& formatName
     return reader;
 }
 
-namespace {
-// Shortest text that reads back to the same value; JSON has no NaN or infinity.
-template <class T>
-nlohmann::json Number(T value)
+// JSON has no NaN or infinity: such a coordinate is written as null.
+nlohmann::json ZonToolNumber(float value)
 {
     if (!std::isfinite(value)) return nullptr;
-    char buffer[64];
+    // The double nearest to the float's shortest text is printed as that text
+    // and reads back, narrowed, to the same float.
+    char buffer[32];
     const auto [end, ec] = std::to_chars(buffer, buffer + sizeof buffer, value);
-    return nlohmann::json::parse(std::string_view(buffer, static_cast<std::size_t>(end - buffer)));
+    double widened = value;
+    if (ec == std::errc()) std::from_chars(buffer, end, widened);
+    return widened;
 }
-}  // namespace
 
-nlohmann::json ZonToolNumber(float value) { return Number(value); }
-nlohmann::json ZonToolNumber(double value) { return Number(value); }
+// The JSON writer prints a double's shortest round-trip text.
+nlohmann::json ZonToolNumber(double value) { return std::isfinite(value) ? nlohmann::json(value) : nullptr; }
 
 nlohmann::json ZonToolErrorJson(const ZonError& error)
 {

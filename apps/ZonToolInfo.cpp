@@ -1,19 +1,91 @@
+// zoncloud info: imports a file as the host would and summarises the body.
 #include <iostream>
 
-#include "ZonCloudReadNLSTool.h"
+#include "ZonCldBody.h"
+#include "ZonCldImportServices.h"
 #include "ZonCloudTool.h"
+#include "ZonGeoFactoryProtected.h"
+
+namespace {
+const char* TypeName(int type)
+{
+    switch (type) {
+        case 1: return "cloud";
+        case 2: return "scans";
+        case 3: return "grids";
+        case 4: return "polygons";
+        default: return "unknown";
+    }
+}
+
+nlohmann::json BoxJson(const ZonMathBox& box)
+{
+    if (box.IsEmpty()) return nullptr;
+    const ZonMathPoint& low = box.GetLow();
+    const ZonMathPoint& high = box.GetHigh();
+    nlohmann::json list = nlohmann::json::array();
+    for (double v : {low[0], low[1], low[2], high[0], high[1], high[2]}) list.push_back(ZonToolNumber(v));
+    return list;
+}
+}  // namespace
 
 ZonToolRun ZonToolAddInfo(CLI::App& app)
 {
-    auto* command = app.add_subcommand("info", "Summarise what a file holds");
+    auto* command = app.add_subcommand("info", "Import a file as the host would and summarise what it holds");
     auto options = std::make_shared<ZonToolReaderOptions>();
     auto json = std::make_shared<bool>(false);
     options->AddTo(*command);
     command->add_flag("--json", *json, "Answer as JSON");
     return [options, json]() -> int {
         options->ApplyToSettings();
-        std::string formatName;
-        ZonICloudReadFile_var reader = options->CreateReader(formatName);
-        ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Input, "ERR_FormatNotImplemented");
+        ZonGeoFactoryProtected geometry;
+        const ZonMathTransformation placement;
+        ZonMathTransformation inverse;
+        ZonMathBox box = options->HasBox() ? options->Box() : ZonMathBox();
+        std::vector<ZonString> messages;
+        const ZonUnicodeString file(options->file);
+        const std::shared_ptr<ZonCldBody> body =
+            options->format.empty()
+                ? ZonCldImportServices::BuildCldBodyFromFile(geometry, file, placement, inverse, box, messages)
+                : ZonCldImportServices::BuildCldBodyWithFormat(geometry, ZonUnicodeString(options->format), file,
+                                                               placement, inverse, box, messages);
+        // The statistics text comes last; anything before it is a note of the import.
+        const std::string statistics = messages.empty() ? std::string() : messages.back();
+        if (!messages.empty()) messages.pop_back();
+
+        nlohmann::json summary = {
+            {"file", options->file},
+            {"format", options->FormatName()},
+            {"type", body->GetTypeOfDigitization()},
+            {"points", body->GetNumberOfPoints()},
+            {"sets", body->GetSetsOfScans().size()},
+            {"scans", body->GetNumberOfScans()},
+            {"grids", body->GetNumberOfGrids()},
+            {"polygons", body->GetPolygons().size()},
+            {"triangles", body->GetNumberOfTriangles()},
+            {"bbox", BoxJson(box)},
+            {"unit", body->GetUnitName()},
+            {"messages", messages},
+            {"statistics", statistics},
+        };
+        if (*json) {
+            std::cout << summary.dump(2, ' ', false, nlohmann::json::error_handler_t::replace) << "\n";
+            return 0;
+        }
+        std::cout << "file:      " << options->file << "\n"
+                  << "format:    " << summary["format"].get<std::string>() << "\n"
+                  << "type:      " << body->GetTypeOfDigitization() << " ("
+                  << TypeName(body->GetTypeOfDigitization()) << ")\n"
+                  << "points:    " << body->GetNumberOfPoints() << "\n"
+                  << "sets:      " << body->GetSetsOfScans().size() << "\n"
+                  << "scans:     " << body->GetNumberOfScans() << "\n"
+                  << "grids:     " << body->GetNumberOfGrids() << "\n"
+                  << "polygons:  " << body->GetPolygons().size() << "\n"
+                  << "triangles: " << body->GetNumberOfTriangles() << "\n"
+                  << "bbox:      " << summary["bbox"].dump() << "\n"
+                  << "unit:      " << body->GetUnitName() << "\n";
+        for (const ZonString& message : messages) std::cout << message << "\n";
+        std::cout << "\n" << statistics;
+        return 0;
     };
 }

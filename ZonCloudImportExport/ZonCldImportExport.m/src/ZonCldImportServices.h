@@ -10,6 +10,13 @@ class ZonCldBody;
 class ZonGeoFactoryProtected;
 
 // The one door through which a file is imported as a cloud body.
+//
+// The box is both ways: on entry the import box in the file's own
+// coordinates (empty: take everything), on return the box of what was
+// created, in the document's millimetres. The caller's transformation becomes
+// the body's placement; transformationOut receives its inverse (the identity
+// when it is the identity), which maps document positions back to the file.
+// `messages` receives the engine's notes, then the statistics text last.
 class ZON_CLD_API ZonCldImportServices {
 public:
     // The lower-cased extension of a path, dot included ("" when there is none).
@@ -24,6 +31,15 @@ public:
                                                             const ZonMathTransformation& transformationIn,
                                                             ZonMathTransformation& transformationOut, ZonMathBox& box,
                                                             std::vector<ZonString>& messages);
+    // The same with the format named by the caller instead of the extension's.
+    static std::shared_ptr<ZonCldBody> BuildCldBodyWithFormat(ZonGeoFactoryProtected& factory,
+                                                              const ZonUnicodeString& formatName,
+                                                              const ZonUnicodeString& fileName,
+                                                              const ZonMathTransformation& transformationIn,
+                                                              ZonMathTransformation& transformationOut,
+                                                              ZonMathBox& box, std::vector<ZonString>& messages);
+    // Reports a module error to the session's reporter instead of raising it,
+    // and then appends nothing. `statistics` receives the messages, one a line.
     static void BuildCldBodyListFromFile(ZonGeoFactoryProtected& factory, const ZonUnicodeString& fileName,
                                          const ZonMathTransformation& transformationIn,
                                          ZonMathTransformation& transformationOut, ZonMathBox& box,

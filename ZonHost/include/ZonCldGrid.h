@@ -1,0 +1,26 @@
+#pragma once
+#include <vector>
+
+#include "ZonBaseUnknown.h"
+#include "ZonCldPointArray.h"
+#include "ZonHostExport.h"
+
+// A regular grid of points, row by row; each point has a validity byte
+// (1 a measured point, 0 a hole), so rows keep their length.
+class ZON_HOST_API ZonCldGrid : public ZonBaseUnknown {
+public:
+    struct Row {
+        ZonCldPointArray points;
+        std::vector<unsigned char> valid;
+    };
+    // Adds a row; a null validity means every point is valid.
+    Row& AddRow(const unsigned char* valid, std::size_t count);
+    const std::vector<Row>& GetRows() const { return _rows; }
+    std::size_t GetNumberOfRows() const { return _rows.size(); }
+    // Points with their validity set.
+    std::size_t GetNumberOfValidPoints() const;
+
+private:
+    std::vector<Row> _rows;
+};
+using ZonCldGrid_var = std::shared_ptr<ZonCldGrid>;

@@ -1,0 +1,44 @@
+#pragma once
+#include <memory>
+#include <string>
+#include <vector>
+
+#include "ZonCldBody.h"
+#include "ZonGeoFactoryProtected.h"
+#include "ZonHostExport.h"
+#include "ZonICkeUnit.h"
+#include "ZonMath.h"
+
+class ZonICloudReadFile;
+
+// The host's cloud import engine: walks any reader through the reader
+// interfaces only, and builds the body's entities with the geometric factory.
+//
+// - The reader's type of digitization chooses the walk: 1 one cloud, 2 sets
+//   of scans, 3 sets of grids (rows with validity), 4 polygons. A reader that
+//   does not offer the interface of its type is taken as one cloud.
+// - A non-empty box clips with the reader's own box queries (in the file's
+//   coordinates); an empty box takes everything.
+// - Coordinates are converted to millimetres with the reader's unit, or with
+//   `unit` when the file carries none, then multiplied by `scale`.
+// - Double precision is used when asked for and the reader has it.
+// - Triangles are kept only when `createTriangles` is set; otherwise a mesh
+//   gives its vertices alone.
+// - Colours and the per-point arrays of a cloud are kept when they have one
+//   entry per point: colours R, G, B bytes; attributes 1 and 2 one 32-bit
+//   integer per point (alpha, symbol index); attribute 3 one std::string per
+//   point (text).
+//
+// `statistics` receives one line per count of what was created, labelled
+// with the "ZonCldImportBuild.StatWindow." texts. Errors raised by the reader
+// pass through unchanged; memory exhaustion raises the host's memory error.
+class ZON_HOST_API ZonCldImportEngine {
+public:
+    static void InsertFile(ZonCldBody& body, ZonGeoFactoryProtected& factory,
+                           const std::shared_ptr<ZonICloudReadFile>& reader, bool doublePrecision,
+                           const ZonICkeUnit_var& unit, const ZonMathBox& box, double scale,
+                           std::vector<std::string>& messages, std::string& statistics, bool createTriangles);
+
+    // The statistics label of key ("Points", "Scans", ...), from the module's catalog.
+    static std::string StatLabel(const char* key);
+};

@@ -1,0 +1,81 @@
+#include "ZonCldPointArray.h"
+
+#include <cmath>
+#include <cstring>
+#include <type_traits>
+
+namespace {
+template <class To, class From>
+void CopyScaled(std::vector<To>& to, const From* from, std::size_t count, double factor)
+{
+    to.resize(3 * count);
+    if (count == 0) return;
+    if constexpr (std::is_same_v<To, From>) {
+        if (factor == 1.0) {
+            std::memcpy(to.data(), from, 3 * count * sizeof(To));
+            return;
+        }
+    }
+    for (std::size_t i = 0; i < 3 * count; ++i) to[i] = static_cast<To>(static_cast<double>(from[i]) * factor);
+}
+
+template <class T>
+void SelectTriples(std::vector<T>& values, const std::vector<std::size_t>& indices)
+{
+    std::vector<T> kept(3 * indices.size());
+    for (std::size_t i = 0; i < indices.size(); ++i)
+        for (std::size_t k = 0; k < 3; ++k) kept[3 * i + k] = values[3 * indices[i] + k];
+    values = std::move(kept);
+}
+}  // namespace
+
+void ZonCldPointArray::AssignScaled(const float* xyz, std::size_t count, double factor)
+{
+    _double = false;
+    _doubles.clear();
+    CopyScaled(_floats, xyz, count, factor);
+}
+
+void ZonCldPointArray::AssignScaled(const double* xyz, std::size_t count, double factor)
+{
+    _double = true;
+    _floats.clear();
+    CopyScaled(_doubles, xyz, count, factor);
+}
+
+void ZonCldPointArray::Select(const std::vector<std::size_t>& indices)
+{
+    if (_double)
+        SelectTriples(_doubles, indices);
+    else
+        SelectTriples(_floats, indices);
+}
+
+ZonMathPoint ZonCldPointArray::GetPoint(std::size_t index) const
+{
+    if (_double) return ZonMathPoint(_doubles[3 * index], _doubles[3 * index + 1], _doubles[3 * index + 2]);
+    return ZonMathPoint(_floats[3 * index], _floats[3 * index + 1], _floats[3 * index + 2]);
+}
+
+void ZonCldPointArray::AddToBox(ZonMathBox& box, const unsigned char* flags) const
+{
+    const std::size_t n = GetNumberOfPoints();
+    if (n == 0) return;
+    // Accumulate in plain doubles: AddPoint per point is the slow path for millions of points.
+    double low[3], high[3];
+    bool any = false;
+    for (std::size_t i = 0; i < n; ++i) {
+        if (flags && !flags[i]) continue;
+        const ZonMathPoint p = GetPoint(i);
+        // A point with a missing coordinate has no place in a box.
+        if (!std::isfinite(p[0]) || !std::isfinite(p[1]) || !std::isfinite(p[2])) continue;
+        for (int a = 0; a < 3; ++a) {
+            if (!any || p[a] < low[a]) low[a] = p[a];
+            if (!any || p[a] > high[a]) high[a] = p[a];
+        }
+        any = true;
+    }
+    if (!any) return;
+    box.AddPoint(low[0], low[1], low[2]);
+    box.AddPoint(high[0], high[1], high[2]);
+}

@@ -1,0 +1,4 @@
+#include "ZonCldScan.h"
+
+// Out of line: anchors the class's type information in the host library.
+ZonCldScan::~ZonCldScan() = default;
