@@ -1,0 +1,6 @@
+#include "ZonExchMemoryProduct.h"
+
+ZonIExchInstance_var ZonExchMemoryProduct::GetInstance(unsigned instance)
+{
+    return instance < _instances.size() ? _instances[instance] : nullptr;
+}
