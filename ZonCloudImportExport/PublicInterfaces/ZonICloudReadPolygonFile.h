@@ -25,5 +25,13 @@ public:
     // vertices inside it (given back through vertices / vertexCount).
     virtual const unsigned* GetTrianglesInBox(const ZonMathBox& box, unsigned& count, const float*& vertices,
                                               unsigned& vertexCount) = 0;
+    // The number of triangles, for statistics. A reader that knows it from its
+    // analysis answers without reading the mesh; by default the mesh is read.
+    virtual unsigned GetNumberOfTriangles()
+    {
+        unsigned count = 0;
+        GetTriangles(count);
+        return count;
+    }
 };
 using ZonICloudReadPolygonFile_var = std::shared_ptr<ZonICloudReadPolygonFile>;

@@ -1,0 +1,724 @@
+#include "ZonCloudReadStl.h"
+
+#include <algorithm>
+#include <bit>
+#include <cerrno>
+#include <cstring>
+#include <limits>
+#include <new>
+
+#include <sys/stat.h>
+
+#include "DecimalPointGuard.h"
+#include "ZonCloudOperErrorTool.h"
+#include "ZonCloudReadNLSTool.h"
+#include "ZonCloudScanFormat.h"
+#include "ZonCloudVertexTable.h"
+
+namespace {
+
+constexpr std::size_t kHeaderSize = 80;
+constexpr long kCountOffset = 80;
+constexpr std::size_t kRecordSize = 50;    // normal, three vertices, attribute word
+constexpr std::size_t kRecordFloats = 48;  // a record counts once its floats are there
+constexpr std::size_t kVertexOffset = 12;  // the normal comes first and is skipped
+// The text form is read as fgets with a 512-byte buffer reads it: a longer
+// line comes as several lines.
+constexpr std::size_t kLineMax = 511;
+constexpr int kKindTestLines = 100;
+constexpr int kMaxConsecutiveFailures = 3;
+constexpr std::size_t kBlockSize = std::size_t(1) << 20;
+// Three corners per triangle must stay countable in 32 bits.
+constexpr std::int64_t kMaxTriangles = std::numeric_limits<std::uint32_t>::max() / 3;
+
+using Tool = ZonCloudReadNLSTool;
+
+[[noreturn]] void RaiseOutOfMemory()
+{
+    ZonCloudOperError error(ZonCloudOperErrorTool::InsufficientMemoryKey, ZonCloudOperErrorTool::Catalog);
+    error.SetSeverity(4);
+    error.SetSource(__FILE__, __LINE__);
+    throw error;
+}
+
+// A short read: the system's error when there was one, else the end of the data.
+[[noreturn]] void RaiseShortRead(FILE* file, Tool::ErrorType type)
+{
+    if (!std::ferror(file) || errno == 0) errno = ENODATA;
+    Tool::Raise(type, nullptr);
+}
+
+std::size_t ReadBytes(FILE* file, void* buffer, std::size_t size)
+{
+    errno = 0;
+    const std::size_t got = std::fread(buffer, 1, size, file);
+    if (got < size && std::ferror(file)) {
+        if (errno == 0) errno = EIO;
+        Tool::Raise(Tool::Input, nullptr);
+    }
+    return got;
+}
+
+// The lines of a text file in big blocks, cut as fgets(buffer, 512) cuts them.
+class LineSource {
+public:
+    LineSource(FILE* file, std::size_t blockSize) : _file(file), _buffer(std::max(blockSize, 2 * kLineMax)) {}
+
+    // The next line, up to its first NUL (where a C string would end it).
+    bool Next(const char*& first, const char*& last)
+    {
+        if (_end - _pos < kLineMax && !_eof) Refill();
+        if (_pos == _end) return false;
+        const char* begin = _buffer.data() + _pos;
+        const std::size_t available = std::min(_end - _pos, kLineMax);
+        const void* newline = std::memchr(begin, '\n', available);
+        const std::size_t length = newline ? static_cast<const char*>(newline) - begin + 1 : available;
+        _pos += length;
+        const void* nul = std::memchr(begin, '\0', length);
+        first = begin;
+        last = nul ? static_cast<const char*>(nul) : begin + length;
+        return true;
+    }
+
+private:
+    void Refill()
+    {
+        std::memmove(_buffer.data(), _buffer.data() + _pos, _end - _pos);
+        _end -= _pos;
+        _pos = 0;
+        const std::size_t wanted = _buffer.size() - _end;
+        const std::size_t got = ReadBytes(_file, _buffer.data() + _end, wanted);
+        _end += got;
+        if (got < wanted) _eof = true;
+    }
+
+    FILE* _file;
+    std::vector<char> _buffer;
+    std::size_t _pos = 0;
+    std::size_t _end = 0;
+    bool _eof = false;
+};
+
+const char* Find(const char* first, const char* last, const char* word)
+{
+    constexpr std::size_t length = 6;
+    while (last - first >= static_cast<std::ptrdiff_t>(length)) {
+        const void* hit = std::memchr(first, word[0], static_cast<std::size_t>(last - first) - (length - 1));
+        if (!hit) return nullptr;
+        first = static_cast<const char*>(hit);
+        if (std::memcmp(first, word, length) == 0) return first;
+        ++first;
+    }
+    return nullptr;
+}
+
+// Where the numbers of a vertex line start: just after its first "vertex",
+// else after its first "VERTEX"; null for any other line.
+const char* AfterKeyword(const char* first, const char* last)
+{
+    if (const char* hit = Find(first, last, "vertex")) return hit + 6;
+    if (const char* hit = Find(first, last, "VERTEX")) return hit + 6;
+    return nullptr;
+}
+
+bool IsSpace(char c) { return c == ' ' || (c >= '\t' && c <= '\r'); }
+
+const char* ParseNumber(const char* first, const char* last, char point, float& value)
+{
+    return ZonParseFloat(first, last, point, value);
+}
+
+const char* ParseNumber(const char* first, const char* last, char point, double& value)
+{
+    return ZonParseDouble(first, last, point, value);
+}
+
+// Three numbers as "%f%f%f" (or "%lf%lf%lf") read them. A number followed by
+// white space or the end of the line reads the same with the number parser,
+// which is the fast path; anything else ("1e+", "0x", "infinit", the other
+// decimal point) goes to the scan engine, which follows sscanf there too.
+template <class T>
+bool ParseVertex(const char* first, const char* last, char point, T* xyz)
+{
+    const char* p = first;
+    for (int i = 0; i < 3; ++i) {
+        const char* end = ParseNumber(p, last, point, xyz[i]);
+        if (!end || (end < last && !IsSpace(*end))) {
+            static const ZonCloudScanFormat format(std::is_same_v<T, float> ? "%f%f%f" : "%lf%lf%lf");
+            void* const destinations[] = {xyz, xyz + 1, xyz + 2, nullptr};
+            return format.Scan(first, last, point, destinations) == 3;
+        }
+        p = end;
+    }
+    return true;
+}
+
+template <bool Reverse>
+float LoadFloat(const unsigned char* p)
+{
+    std::uint32_t bits;
+    std::memcpy(&bits, p, sizeof bits);
+    if constexpr (Reverse) bits = __builtin_bswap32(bits);
+    return std::bit_cast<float>(bits);
+}
+
+template <bool Reverse>
+void LoadCorners(const unsigned char* record, float corners[9])
+{
+    for (int k = 0; k < 9; ++k) corners[k] = LoadFloat<Reverse>(record + kVertexOffset + 4 * k);
+}
+
+// Hands each record from the current position to `onRecord`, at most
+// `maxCount` of them, reading the file in big blocks; stops at the first
+// short one. Returns how many were handed.
+template <class OnRecord>
+std::uint64_t ForEachRecord(FILE* file, std::uint64_t maxCount, std::vector<unsigned char>& buffer,
+                            OnRecord onRecord)
+{
+    const std::size_t perBlock = buffer.size() / kRecordSize;
+    std::uint64_t done = 0;
+    while (done < maxCount) {
+        const std::size_t records = static_cast<std::size_t>(std::min<std::uint64_t>(perBlock, maxCount - done));
+        const std::size_t wanted = records * kRecordSize;
+        const std::size_t got = ReadBytes(file, buffer.data(), wanted);
+        std::size_t whole = got / kRecordSize;
+        // The last record may lack its attribute word.
+        if (got < wanted && got % kRecordSize >= kRecordFloats) ++whole;
+        for (std::size_t i = 0; i < whole; ++i) onRecord(buffer.data() + i * kRecordSize);
+        done += whole;
+        if (got < wanted) break;
+    }
+    return done;
+}
+
+// Box of the coordinates seen; a NaN coordinate widens nothing.
+template <class T>
+struct BoxAccumulator {
+    T low[3] = {std::numeric_limits<T>::infinity(), std::numeric_limits<T>::infinity(),
+                std::numeric_limits<T>::infinity()};
+    T high[3] = {-std::numeric_limits<T>::infinity(), -std::numeric_limits<T>::infinity(),
+                 -std::numeric_limits<T>::infinity()};
+
+    void Add(const T* v)
+    {
+        for (int i = 0; i < 3; ++i) {
+            low[i] = v[i] < low[i] ? v[i] : low[i];
+            high[i] = v[i] > high[i] ? v[i] : high[i];
+        }
+    }
+    bool IsEmpty() const { return !(low[0] <= high[0] && low[1] <= high[1] && low[2] <= high[2]); }
+    ZonMathBox Box() const
+    {
+        ZonMathBox box;
+        if (!IsEmpty()) box.SetLowHigh(ZonMathPoint(low[0], low[1], low[2]), ZonMathPoint(high[0], high[1], high[2]));
+        return box;
+    }
+};
+
+// The byte-order rule: which reading of the count word (n in this machine's
+// order, s reversed) fits a file that can hold e records (-1: size unknown).
+// The count is -1 when none fits.
+struct CountChoice {
+    std::int64_t count;
+    bool native;
+};
+
+CountChoice ChooseCount(std::int64_t n, std::int64_t s, std::int64_t e)
+{
+    const auto capped = [e](std::int64_t c) { return e >= 1 && c > e ? e : c; };
+    if (n < 0 && s < 0) return {e >= 1 ? e : -1, true};
+    if (n > 0 && s < 0) return {capped(n), true};
+    if (s > 0 && n < 0) return {capped(s), false};
+    if (e < 0) return {n, true};
+    if (n > e) {
+        if (s > e) return {e, n <= s};
+        return {s, false};
+    }
+    if (s > e) return {n, true};
+    if (s > n) return {s, false};
+    return {n, true};
+}
+
+}  // namespace
+
+ZonCloudReadStl::ZonCloudReadStl(const ZonUnicodeString& fileName) : ZonCloudReadFile(fileName) {}
+
+ZonCloudReadStl::~ZonCloudReadStl() = default;
+
+// ---------------------------------------------------------------- analysis
+
+void ZonCloudReadStl::Reset()
+{
+    CloseFile();
+    ClearBoxCaches();
+    _analysed = false;
+    _digitizationType = DigitizationUnknown;
+    _numberOfPoints = 0;
+    _boundingBox.SetToEmpty();
+    _isText = false;
+    _separatorSwitched = false;
+    _vertexCount = 0;
+    _triangleCount = 0;
+    _meshLoaded = false;
+    _meshInDouble = false;
+    _distinctCount = 0;
+    _vertices = {};
+    _verticesDouble = {};
+    _triangles = {};
+    _sub = {};
+    _polygonBegun = false;
+    _polygonDelivered = false;
+    _triangleCursor = 0;
+    _boxTriangles = nullptr;
+    _boxTriangleCount = 0;
+    _boxTriangleCursor = 0;
+}
+
+void ZonCloudReadStl::Analyse()
+{
+    if (_reanalyse) {
+        Reset();
+        _reanalyse = false;
+    }
+    if (_analysed) return;
+    try {
+        OpenFile();
+        _isText = IsTextCandidate() && HasVertexLineNearStart();
+        if (_isText)
+            AnalyseText();
+        else
+            AnalyseBinary();
+    } catch (const std::bad_alloc&) {
+        CloseFile();
+        RaiseOutOfMemory();
+    } catch (...) {
+        CloseFile();
+        throw;
+    }
+    _digitizationType = DigitizationPolygons;
+    _numberOfPoints = static_cast<int>(std::min<std::uint32_t>(_vertexCount, std::numeric_limits<int>::max()));
+    _analysed = true;
+}
+
+bool ZonCloudReadStl::IsTextCandidate()
+{
+    char head[kLineMax + 1] = {};
+    const std::size_t got = ReadBytes(_file, head, kLineMax);
+    const auto contains = [&](const char* word) {
+        return std::search(head, head + got, word, word + 5) != head + got;
+    };
+    return contains("solid") || contains("SOLID");
+}
+
+// Binary headers often begin with "solid" too: only a vertex line near the
+// start makes the file text.
+bool ZonCloudReadStl::HasVertexLineNearStart()
+{
+    SeekFile(0);
+    LineSource lines(_file, 64 * 1024);
+    const char* first = nullptr;
+    const char* last = nullptr;
+    for (int without = 0; without < kKindTestLines && lines.Next(first, last); ++without)
+        if (AfterKeyword(first, last)) return true;
+    return false;
+}
+
+void ZonCloudReadStl::AnalyseText()
+{
+    DecimalPointGuard separator;
+    bool otherTried = false;
+    for (;;) {
+        SeekFile(0);
+        LineSource lines(_file, kBlockSize);
+        BoxAccumulator<double> box;
+        std::uint64_t found = 0;
+        int failures = 0;
+        bool retry = false;
+        const char point = separator.DecimalPoint();
+        const char* first = nullptr;
+        const char* last = nullptr;
+        while (lines.Next(first, last)) {
+            const char* numbers = AfterKeyword(first, last);
+            if (!numbers) continue;
+            double xyz[3];
+            bool parsed;
+            if (_doublePrecision) {
+                parsed = ParseVertex(numbers, last, point, xyz);
+            } else {
+                float f[3];
+                parsed = ParseVertex(numbers, last, point, f);
+                std::copy(f, f + 3, xyz);
+            }
+            if (parsed) {
+                ++found;
+                box.Add(xyz);
+                failures = 0;
+                continue;
+            }
+            if (++failures <= kMaxConsecutiveFailures) continue;
+            // A file written with the other decimal separator fails on every
+            // vertex line: try it once with the other one.
+            if (otherTried || !separator.Switch()) Tool::Raise(Tool::Data, "ERR_TooManyUnknownData");
+            otherTried = true;
+            retry = true;
+            break;
+        }
+        if (retry) continue;
+        if (found == 0) Tool::Raise(Tool::Data, "ERR_NoPointFound");
+        const std::uint64_t triangles = std::min<std::uint64_t>(found / 3, kMaxTriangles);
+        _triangleCount = static_cast<std::uint32_t>(triangles);
+        _vertexCount = static_cast<std::uint32_t>(std::min<std::uint64_t>(found, 3 * kMaxTriangles));
+        _boundingBox = box.Box();
+        _separatorSwitched = separator.IsSwitched();
+        return;
+    }
+}
+
+void ZonCloudReadStl::AnalyseBinary()
+{
+    SeekFile(0);
+    unsigned char header[kHeaderSize];
+    if (ReadBytes(_file, header, kHeaderSize) < kHeaderSize) RaiseShortRead(_file, Tool::Data);
+    std::int32_t stored = 0;
+    if (ReadBytes(_file, &stored, sizeof stored) < sizeof stored) RaiseShortRead(_file, Tool::Input);
+    const auto reversed = static_cast<std::int32_t>(__builtin_bswap32(static_cast<std::uint32_t>(stored)));
+
+    struct stat info {};
+    const std::int64_t size = fstat(fileno(_file), &info) == 0 ? static_cast<std::int64_t>(info.st_size) : -1;
+    const std::int64_t fits = size > 0 ? (size - 84) / static_cast<std::int64_t>(kRecordSize) : -1;
+
+    const CountChoice choice = ChooseCount(stored, reversed, fits);
+    _byteOrder = choice.native ? Current : Differ;
+    _nativeOrder = choice.native;
+    if (choice.count < 0) Tool::Raise(Tool::Data, "ERR_UnknownData");
+
+    // The count word is only a bound: what counts is what the file holds.
+    std::vector<unsigned char> buffer(kBlockSize - kBlockSize % kRecordSize);
+    BoxAccumulator<float> box;
+    const auto widen = [&box](const float* corners) {
+        box.Add(corners);
+        box.Add(corners + 3);
+        box.Add(corners + 6);
+    };
+    const std::uint64_t wanted = static_cast<std::uint64_t>(std::min(choice.count, kMaxTriangles));
+    std::uint64_t records;
+    if (_nativeOrder)
+        records = ForEachRecord(_file, wanted, buffer, [&](const unsigned char* record) {
+            float corners[9];
+            LoadCorners<false>(record, corners);
+            widen(corners);
+        });
+    else
+        records = ForEachRecord(_file, wanted, buffer, [&](const unsigned char* record) {
+            float corners[9];
+            LoadCorners<true>(record, corners);
+            widen(corners);
+        });
+    _triangleCount = static_cast<std::uint32_t>(records);
+    _vertexCount = 3 * _triangleCount;
+    if (records == 0) Tool::Raise(Tool::Data, "ERR_NoPointFound");
+
+    // Any 84 bytes can pass for a header and a count: a box of nothing or of
+    // absurd size tells that the rest was not STL data.
+    const double extent[3] = {double(box.high[0]) - box.low[0], double(box.high[1]) - box.low[1],
+                              double(box.high[2]) - box.low[2]};
+    const bool plausible = !box.IsEmpty() && extent[0] + extent[1] + extent[2] > 1e-6 &&
+                           extent[0] * extent[1] * extent[2] < 3.4028234663852886e+38;
+    if (!plausible) Tool::Raise(Tool::Data, "ERR_UnknownData");
+    _boundingBox = box.Box();
+}
+
+void ZonCloudReadStl::SeekFile(long offset)
+{
+    errno = 0;
+    if (!_file || std::fseek(_file, offset, SEEK_SET) != 0) {
+        if (errno == 0) errno = EBADF;
+        Tool::Raise(Tool::Input, nullptr);
+    }
+}
+
+bool ZonCloudReadStl::IsTextFile()
+{
+    Analyse();
+    return _isText;
+}
+
+unsigned ZonCloudReadStl::GetNumberOfTriangles()
+{
+    Analyse();
+    return _meshLoaded ? static_cast<unsigned>(_triangles.size() / 3) : _triangleCount;
+}
+
+void ZonCloudReadStl::SetBinaryFrom(int from)
+{
+    if (from < Unknown || from > Differ) Tool::Raise(Tool::Usage, "ERR_Failure");
+    if (from == _byteOrder) return;
+    _byteOrder = from;
+    _nativeOrder = from != Differ;
+    _reanalyse = true;
+}
+
+// ---------------------------------------------------------------- mesh
+
+void ZonCloudReadStl::LoadMesh()
+{
+    Analyse();
+    if (_meshLoaded) return;
+    try {
+        if (!_file) OpenFile();
+        _meshInDouble = _isText && _doublePrecision;
+        if (!_isText)
+            ReadBinaryMesh();
+        else if (_meshInDouble)
+            ReadTextMesh(_verticesDouble);
+        else
+            ReadTextMesh(_vertices);
+    } catch (const std::bad_alloc&) {
+        CloseFile();
+        _vertices = {};
+        _verticesDouble = {};
+        _triangles = {};
+        RaiseOutOfMemory();
+    } catch (...) {
+        CloseFile();
+        _vertices = {};
+        _verticesDouble = {};
+        _triangles = {};
+        throw;
+    }
+    // Everything is in memory now.
+    CloseFile();
+    _meshLoaded = true;
+    _numberOfPoints = static_cast<int>(std::min<std::size_t>(_distinctCount, std::numeric_limits<int>::max()));
+}
+
+namespace {
+// Room for the distinct vertices of a typical mesh, where each vertex is
+// shared by about six triangles; the table and the array grow past it.
+std::size_t ExpectedDistinct(std::uint32_t triangles) { return triangles / 2 + triangles / 32 + 16; }
+
+template <class T>
+void ShrinkIfLoose(std::vector<T>& v)
+{
+    if (v.capacity() - v.size() > v.size() / 4) v.shrink_to_fit();
+}
+}  // namespace
+
+template <class T>
+void ZonCloudReadStl::ReadTextMesh(std::vector<T>& vertices)
+{
+    SeekFile(0);
+    DecimalPointGuard separator;
+    if (_separatorSwitched) separator.Switch();
+    const char point = separator.DecimalPoint();
+
+    vertices.clear();
+    vertices.reserve(3 * ExpectedDistinct(_triangleCount));
+    _triangles.resize(3 * static_cast<std::size_t>(_triangleCount));
+    ZonCloudVertexTable<T> table(vertices, ExpectedDistinct(_triangleCount));
+    LineSource lines(_file, kBlockSize);
+    T corners[9];
+    int pending = 0;
+    std::size_t stored = 0;
+    const char* first = nullptr;
+    const char* last = nullptr;
+    while (stored < _triangleCount && lines.Next(first, last)) {
+        const char* numbers = AfterKeyword(first, last);
+        if (!numbers || !ParseVertex(numbers, last, point, corners + 3 * pending)) continue;
+        if (++pending < 3) continue;
+        pending = 0;
+        std::uint32_t* triangle = _triangles.data() + 3 * stored;
+        triangle[0] = table.Index(corners);
+        triangle[1] = table.Index(corners + 3);
+        triangle[2] = table.Index(corners + 6);
+        ++stored;
+    }
+    _triangles.resize(3 * stored);
+    ShrinkIfLoose(vertices);
+    _distinctCount = vertices.size() / 3;
+}
+
+void ZonCloudReadStl::ReadBinaryMesh()
+{
+    SeekFile(kCountOffset);
+    std::int32_t ignored = 0;
+    if (ReadBytes(_file, &ignored, sizeof ignored) < sizeof ignored) RaiseShortRead(_file, Tool::Input);
+
+    _vertices.clear();
+    _vertices.reserve(3 * ExpectedDistinct(_triangleCount));
+    _triangles.resize(3 * static_cast<std::size_t>(_triangleCount));
+    ZonCloudVertexTable<float> table(_vertices, ExpectedDistinct(_triangleCount));
+    std::vector<unsigned char> buffer(kBlockSize - kBlockSize % kRecordSize);
+    std::uint32_t* triangle = _triangles.data();
+    const auto merge = [&](const float* corners) {
+        triangle[0] = table.Index(corners);
+        triangle[1] = table.Index(corners + 3);
+        triangle[2] = table.Index(corners + 6);
+        triangle += 3;
+    };
+    std::uint64_t stored;
+    if (_nativeOrder)
+        stored = ForEachRecord(_file, _triangleCount, buffer, [&](const unsigned char* record) {
+            float corners[9];
+            LoadCorners<false>(record, corners);
+            merge(corners);
+        });
+    else
+        stored = ForEachRecord(_file, _triangleCount, buffer, [&](const unsigned char* record) {
+            float corners[9];
+            LoadCorners<true>(record, corners);
+            merge(corners);
+        });
+    _triangles.resize(3 * static_cast<std::size_t>(stored));
+    ShrinkIfLoose(_vertices);
+    _distinctCount = _vertices.size() / 3;
+}
+
+const float* ZonCloudReadStl::FloatVertices()
+{
+    if (_meshInDouble && _vertices.size() != 3 * _distinctCount) {
+        try {
+            _vertices.assign(_verticesDouble.begin(), _verticesDouble.end());
+        } catch (const std::bad_alloc&) {
+            _vertices = {};
+            RaiseOutOfMemory();
+        }
+    }
+    return _vertices.data();
+}
+
+const double* ZonCloudReadStl::DoubleVertices()
+{
+    if (!_meshInDouble && _verticesDouble.size() != 3 * _distinctCount) {
+        try {
+            _verticesDouble.assign(_vertices.begin(), _vertices.end());
+        } catch (const std::bad_alloc&) {
+            _verticesDouble = {};
+            RaiseOutOfMemory();
+        }
+    }
+    return _verticesDouble.data();
+}
+
+int ZonCloudReadStl::GetNumberOfPoints()
+{
+    LoadMesh();
+    return _numberOfPoints;
+}
+
+const float* ZonCloudReadStl::GetPoints(unsigned& count)
+{
+    LoadMesh();
+    count = DistinctCount();
+    return FloatVertices();
+}
+
+const double* ZonCloudReadStl::GetPointsDouble(unsigned& count)
+{
+    LoadMesh();
+    count = DistinctCount();
+    return DoubleVertices();
+}
+
+// ---------------------------------------------------------------- polygon protocol
+
+void ZonCloudReadStl::BeginGetPolygon()
+{
+    if (GetTypeOfDigitization() != DigitizationPolygons) Tool::Raise(Tool::Usage, "ERR_NotAPolygonDigit");
+    if (_vertexCount == 0 || _triangleCount == 0) {
+        CloseFile();
+        Tool::Raise(Tool::Data, "ERR_NoPointFound");
+    }
+    _polygonBegun = true;
+    _polygonDelivered = false;
+    _triangleCursor = 0;
+}
+
+bool ZonCloudReadStl::NextPolygon()
+{
+    if (!_polygonBegun) Tool::Raise(Tool::Usage, "ERR_BeginGetPolygonNotDone");
+    if (_polygonDelivered) return false;
+    LoadMesh();
+    _polygonDelivered = true;
+    _triangleCursor = 0;
+    return true;
+}
+
+const float* ZonCloudReadStl::GetPolygonPoints(unsigned& count) { return GetPoints(count); }
+
+const unsigned* ZonCloudReadStl::GetTriangles(unsigned& count)
+{
+    LoadMesh();
+    count = static_cast<unsigned>(_triangles.size() / 3);
+    return _triangles.data();
+}
+
+const unsigned* ZonCloudReadStl::NextTriangle()
+{
+    LoadMesh();
+    if (_triangleCursor >= _triangles.size() / 3) return nullptr;
+    return _triangles.data() + 3 * _triangleCursor++;
+}
+
+const unsigned* ZonCloudReadStl::NextTriangleInBox()
+{
+    if (!_boxTriangles || _boxTriangleCursor >= _boxTriangleCount) return nullptr;
+    return _boxTriangles + 3 * _boxTriangleCursor++;
+}
+
+const unsigned* ZonCloudReadStl::GetTrianglesInBox(const ZonMathBox& box, unsigned& count, const float*& vertices,
+                                                   unsigned& vertexCount)
+{
+    LoadMesh();
+    if (box.IsSameAs(_boundingBox)) {
+        vertices = FloatVertices();
+        vertexCount = DistinctCount();
+        _boxTriangles = _triangles.data();
+        _boxTriangleCount = _triangles.size() / 3;
+    } else {
+        if (!_sub.valid || !box.IsSameAs(_sub.box)) ComputeSubMesh(box);
+        vertices = _sub.vertices.data();
+        vertexCount = static_cast<unsigned>(_sub.vertices.size() / 3);
+        _boxTriangles = _sub.triangles.data();
+        _boxTriangleCount = _sub.triangles.size() / 3;
+    }
+    _boxTriangleCursor = 0;
+    count = static_cast<unsigned>(_boxTriangleCount);
+    return _boxTriangles;
+}
+
+void ZonCloudReadStl::ComputeSubMesh(const ZonMathBox& box)
+{
+    _sub = {};
+    _sub.box = box;
+    _sub.valid = true;
+    if (!box.Intersects(_boundingBox, 0.0)) return;
+    constexpr std::uint32_t outside = std::numeric_limits<std::uint32_t>::max();
+    try {
+        std::vector<std::uint32_t> renumbered(_distinctCount, outside);
+        std::uint32_t inside = 0;
+        const auto keep = [&](const auto* v, std::size_t i) {
+            if (!IsInQueryBox(v[0], v[1], v[2], box, _boundingBox)) return;
+            renumbered[i] = inside++;
+            _sub.vertices.push_back(static_cast<float>(v[0]));
+            _sub.vertices.push_back(static_cast<float>(v[1]));
+            _sub.vertices.push_back(static_cast<float>(v[2]));
+        };
+        for (std::size_t i = 0; i < _distinctCount; ++i) {
+            if (_meshInDouble)
+                keep(_verticesDouble.data() + 3 * i, i);
+            else
+                keep(_vertices.data() + 3 * i, i);
+        }
+        for (std::size_t t = 0; t + 2 < _triangles.size(); t += 3) {
+            const std::uint32_t a = renumbered[_triangles[t]];
+            const std::uint32_t b = renumbered[_triangles[t + 1]];
+            const std::uint32_t c = renumbered[_triangles[t + 2]];
+            if (a == outside || b == outside || c == outside) continue;
+            _sub.triangles.insert(_sub.triangles.end(), {a, b, c});
+        }
+    } catch (const std::bad_alloc&) {
+        _sub = {};
+        RaiseOutOfMemory();
+    }
+}

@@ -1,0 +1,39 @@
+#include "ZonCloudWriteStl.h"
+
+#include <cerrno>
+
+#include "ZonCldSTLBinaryFormat.h"
+#include "ZonCloudReadNLSTool.h"
+
+ZonCloudWriteStl::ZonCloudWriteStl(const ZonUnicodeString& fileName) : ZonCloudWriteFile(fileName) {}
+
+void ZonCloudWriteStl::BeginWriteTriangles(const unsigned& count)
+{
+    if (!_file) {
+        // Opened for update: a later announcement reads the count back.
+        OpenStream("w+b");
+        _headerPending = true;
+    }
+    ZonCldSTLBinaryFormat::AnnounceTriangles(_file, _headerPending, count, _reverseBytes);
+    _expected += count;
+}
+
+void ZonCloudWriteStl::WriteTriangle(const float vertices[9])
+{
+    if (!_file) {
+        errno = EBADF;
+        ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, nullptr);
+    }
+    if (_expected == 0) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_Failure");
+    float normal[3];
+    ZonCldSTLBinaryFormat::Normal(vertices, normal);
+    ZonCldSTLBinaryFormat::WriteFacet(_file, normal, vertices, _reverseBytes);
+    --_expected;
+}
+
+void ZonCloudWriteStl::EndWriteTriangles()
+{
+    const bool complete = _expected == 0;
+    _expected = 0;
+    if (!complete) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_Failure");
+}
