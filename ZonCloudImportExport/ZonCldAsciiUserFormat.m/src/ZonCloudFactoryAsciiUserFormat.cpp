@@ -19,23 +19,23 @@ ZonICloudReadFile_var ZonCloudFactoryAsciiUserFormat::CreateReader(const ZonUnic
     return reader;
 }
 
-int ZonCloudFactoryAsciiUserFormat::OptionsToSettings(const ZonListValZonString& keys,
+ZonHResult ZonCloudFactoryAsciiUserFormat::OptionsToSettings(const ZonListValZonString& keys,
                                                       const ZonListValZonString& values, ZonUnicodeString& fdfPath)
 {
-    if (keys.size() != values.size()) return Failure;
+    if (keys.size() != values.size()) return ZON_E_FAIL;
     for (std::size_t i = 0; i < keys.size(); ++i) {
         if (keys[i] == OptionFDFFileName) {
             fdfPath = ZonUnicodeString(values[i]);
-            return Success;
+            return ZON_S_OK;
         }
     }
-    return Failure;
+    return ZON_E_FAIL;
 }
 
-int ZonCloudFactoryAsciiUserFormat::SettingsToOptions(const ZonUnicodeString& fdfPath, ZonListValZonString& keys,
+ZonHResult ZonCloudFactoryAsciiUserFormat::SettingsToOptions(const ZonUnicodeString& fdfPath, ZonListValZonString& keys,
                                                       ZonListValZonString& values)
 {
     keys.assign(1, OptionFDFFileName);
     values.assign(1, fdfPath.ToUtf8());
-    return Success;
+    return ZON_S_OK;
 }

@@ -20,25 +20,25 @@ ZonICloudReadFile_var ZonCloudFactoryLeica::CreateReader(const ZonUnicodeString&
     return reader;
 }
 
-int ZonCloudFactoryLeica::OptionsToSettings(const ZonListValZonString& keys, const ZonListValZonString& values,
+ZonHResult ZonCloudFactoryLeica::OptionsToSettings(const ZonListValZonString& keys, const ZonListValZonString& values,
                                             bool& keepColors)
 {
-    if (keys.size() != values.size()) return Failure;
+    if (keys.size() != values.size()) return ZON_E_FAIL;
     for (std::size_t i = 0; i < keys.size(); ++i) {
         if (keys[i] != OptionKeepColors) continue;
         const std::string& text = values[i];
         int flag = 0;
         const auto [end, ec] = std::from_chars(text.data(), text.data() + text.size(), flag);
-        if (ec != std::errc() || end == text.data()) return Failure;
+        if (ec != std::errc() || end == text.data()) return ZON_E_FAIL;
         keepColors = flag != 0;
-        return Success;
+        return ZON_S_OK;
     }
-    return Failure;
+    return ZON_E_FAIL;
 }
 
-int ZonCloudFactoryLeica::SettingsToOptions(bool keepColors, ZonListValZonString& keys, ZonListValZonString& values)
+ZonHResult ZonCloudFactoryLeica::SettingsToOptions(bool keepColors, ZonListValZonString& keys, ZonListValZonString& values)
 {
     keys.assign(1, OptionKeepColors);
     values.assign(1, std::to_string(keepColors ? 1 : 0));
-    return Success;
+    return ZON_S_OK;
 }

@@ -1,6 +1,7 @@
 #pragma once
 #include "ZonCldExport.h"
 #include "ZonCloudReadFileFactory.h"
+#include "ZonHResult.h"
 
 // Factory of RGB point files; the reader keeps colours unless the settings
 // say "KeepColors" is off.
@@ -8,14 +9,12 @@ class ZON_CLD_API ZonCloudFactoryLeica : public ZonCloudReadFileFactory {
 public:
     // The exchange option of the format, a flag written with "%d".
     static constexpr const char* OptionKeepColors = "KeepColors";
-    static constexpr int Success = 0;
-    static constexpr int Failure = static_cast<int>(0x80004005u);
 
     ZonCloudFactoryLeica();
     ZonICloudReadFile_var CreateReader(const ZonUnicodeString& fileName) override;
 
     // Exchange options to the keep-colours choice: "KeepColors" among the
     // keys (keys and values side by side), its value an integer.
-    static int OptionsToSettings(const ZonListValZonString& keys, const ZonListValZonString& values, bool& keepColors);
-    static int SettingsToOptions(bool keepColors, ZonListValZonString& keys, ZonListValZonString& values);
+    static ZonHResult OptionsToSettings(const ZonListValZonString& keys, const ZonListValZonString& values, bool& keepColors);
+    static ZonHResult SettingsToOptions(bool keepColors, ZonListValZonString& keys, ZonListValZonString& values);
 };

@@ -1,0 +1,77 @@
+#include "ZonCloudWriteCgoAscii.h"
+
+#include "ZonCloudReadNLSTool.h"
+
+namespace {
+// The count line of a multi-part file before its total is known.
+constexpr const char* Placeholder = "            \n";
+}
+
+ZonCloudWriteCgoAscii::ZonCloudWriteCgoAscii(const ZonUnicodeString& fileName) : ZonCloudWriteFile(fileName) {}
+
+ZonHResult ZonCloudWriteCgoAscii::BeginMultiWrite()
+{
+    if (!TryOpenStream("w")) return ZON_E_FAIL;
+    Print("%s", Placeholder);
+    _multiWrite = true;
+    _total = 0;
+    _expected = 0;
+    return ZON_S_OK;
+}
+
+ZonHResult ZonCloudWriteCgoAscii::EndMultiWrite()
+{
+    if (_file) {
+        Print("**end cloud**\n");
+        if (std::fseek(_file, 0, SEEK_SET) == 0) Print("%-12d", static_cast<int>(_total));
+    }
+    CloseStream();
+    _multiWrite = false;
+    _total = 0;
+    return ZON_S_OK;
+}
+
+void ZonCloudWriteCgoAscii::BeginWritePoints(const unsigned& count)
+{
+    if (_multiWrite) {
+        _total += count;
+        _expected += count;
+        return;
+    }
+    OpenStream("w");
+    Print("%ld\n", static_cast<long>(count));
+    _expected = count;
+}
+
+void ZonCloudWriteCgoAscii::PointLine(double x, double y, double z)
+{
+    if (!_file || _expected == 0) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_Failure");
+    Print("%f %f %f\n", x, y, z);
+    --_expected;
+}
+
+void ZonCloudWriteCgoAscii::WritePoint(const float xyz[3]) { PointLine(xyz[0], xyz[1], xyz[2]); }
+
+void ZonCloudWriteCgoAscii::WritePointDouble(const double xyz[3]) { PointLine(xyz[0], xyz[1], xyz[2]); }
+
+void ZonCloudWriteCgoAscii::WritePointColor(const float xyz[3], const unsigned char*)
+{
+    PointLine(xyz[0], xyz[1], xyz[2]);
+}
+
+void ZonCloudWriteCgoAscii::WritePointColorDouble(const double xyz[3], const unsigned char*)
+{
+    PointLine(xyz[0], xyz[1], xyz[2]);
+}
+
+void ZonCloudWriteCgoAscii::EndWritePoints()
+{
+    if (!_multiWrite && _file) {
+        Print("**end cloud**\n");
+        CloseStream();
+    }
+    if (_expected != 0) {
+        _expected = 0;
+        ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_Failure");
+    }
+}

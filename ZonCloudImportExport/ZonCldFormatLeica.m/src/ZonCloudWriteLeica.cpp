@@ -1,0 +1,50 @@
+#include "ZonCloudWriteLeica.h"
+
+#include "ZonCloudReadNLSTool.h"
+
+namespace {
+const unsigned char White[3] = {255, 255, 255};
+}
+
+ZonCloudWriteLeica::ZonCloudWriteLeica(const ZonUnicodeString& fileName) : ZonCloudWriteFile(fileName) {}
+
+void ZonCloudWriteLeica::BeginWritePoints(const unsigned& count)
+{
+    if (_multiWrite) {
+        _expected += count;
+        return;
+    }
+    OpenStream("w");
+    Print("%ld\n", static_cast<long>(count));
+    _expected = count;
+}
+
+void ZonCloudWriteLeica::PointLine(double x, double y, double z, const unsigned char rgb[3])
+{
+    if (!_file || _expected == 0) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_Failure");
+    Print("%f %f %f %d %d %d\n", x, y, z, rgb[0], rgb[1], rgb[2]);
+    --_expected;
+}
+
+void ZonCloudWriteLeica::WritePoint(const float xyz[3]) { PointLine(xyz[0], xyz[1], xyz[2], White); }
+
+void ZonCloudWriteLeica::WritePointDouble(const double xyz[3]) { PointLine(xyz[0], xyz[1], xyz[2], White); }
+
+void ZonCloudWriteLeica::WritePointColor(const float xyz[3], const unsigned char rgb[3])
+{
+    PointLine(xyz[0], xyz[1], xyz[2], rgb);
+}
+
+void ZonCloudWriteLeica::WritePointColorDouble(const double xyz[3], const unsigned char rgb[3])
+{
+    PointLine(xyz[0], xyz[1], xyz[2], rgb);
+}
+
+void ZonCloudWriteLeica::EndWritePoints()
+{
+    if (!_multiWrite) CloseStream();
+    if (_expected != 0) {
+        _expected = 0;
+        ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_Failure");
+    }
+}
