@@ -1,0 +1,207 @@
+// RGB point files: the colour rules, the count line, the decimal swap after
+// 200 unknown lines, the writer's bytes and its round trip.
+#include <gtest/gtest.h>
+
+#include <cstdlib>
+#include <filesystem>
+#include <fstream>
+#include <functional>
+#include <sstream>
+#include <string>
+#include <vector>
+
+#include "ZonCldSettings.h"
+#include "ZonCloudFactoryLeica.h"
+#include "ZonCloudReadLeica.h"
+#include "ZonCloudWriteLeica.h"
+#include "ZonError.h"
+
+namespace fs = std::filesystem;
+
+namespace {
+
+class RgbPoints : public ::testing::Test {
+protected:
+    void SetUp() override
+    {
+        char pattern[] = "/tmp/zon_rgb_XXXXXX";
+        ASSERT_NE(mkdtemp(pattern), nullptr);
+        dir_ = pattern;
+        ZonCldSettings::Instance().ResetAll();
+    }
+    void TearDown() override
+    {
+        fs::remove_all(dir_);
+        ZonCldSettings::Instance().ResetAll();
+    }
+
+    std::string Write(const std::string& name, const std::string& content)
+    {
+        const std::string path = (dir_ / name).string();
+        std::ofstream(path, std::ios::binary) << content;
+        return path;
+    }
+    static std::string Read(const std::string& path)
+    {
+        std::ifstream in(path, std::ios::binary);
+        std::stringstream text;
+        text << in.rdbuf();
+        return text.str();
+    }
+    static std::vector<double> Points(ZonCloudReadLeica& reader)
+    {
+        unsigned n = 0;
+        const double* p = reader.GetPointsDouble(n);
+        return std::vector<double>(p, p + 3 * n);
+    }
+    static std::vector<int> Colors(ZonCloudReadLeica& reader)
+    {
+        unsigned n = 0;
+        const unsigned char* c = reader.GetPointColors(n);
+        return std::vector<int>(c, c + 3 * n);
+    }
+    static std::string ErrorKey(const std::function<void()>& call)
+    {
+        try {
+            call();
+        } catch (const ZonError& error) {
+            return error.GetMessageKey();
+        }
+        return "";
+    }
+
+    fs::path dir_;
+};
+
+TEST_F(RgbPoints, ColourRulesForThreeToSevenValues)
+{
+    const struct {
+        std::string line;
+        std::vector<int> color;
+    } cases[] = {
+        {"1 2 3 10 20 30", {10, 20, 30}},
+        {"1 2 3 99 10 20 30", {10, 20, 30}},    // intensity, then the colour
+        {"1 2 3 300 20 30", {255, 255, 255}},   // six values, the first out of range
+        {"1 2 3 10 20 30 256", {255, 255, 255}},
+        {"1 2 3 10 20 300", {10, 20, 255}},     // six values, the fourth in range: a component above 255 saturates
+        {"1 2 3", {255, 255, 255}},
+        {"1 2 3 10 20", {255, 255, 255}},
+        {"1 2 3 1.5 20 30", {255, 255, 255}},   // the intensity ends the integers
+    };
+    for (const auto& c : cases) {
+        ZonCloudReadLeica reader(Write("p.asc_rgb", c.line + "\n"));
+        EXPECT_EQ(Points(reader), (std::vector<double>{1, 2, 3})) << c.line;
+        EXPECT_EQ(Colors(reader), c.color) << c.line;
+    }
+}
+
+TEST_F(RgbPoints, ColoursCanBeLeftOut)
+{
+    ZonCloudReadLeica reader(Write("p.asc_rgb", "1 2 3 10 20 30\n"));
+    EXPECT_EQ(Colors(reader), (std::vector<int>{10, 20, 30}));
+    reader.SetKeepColors(false);
+    EXPECT_FALSE(reader.GetKeepColors());
+    EXPECT_EQ(Colors(reader), std::vector<int>{});
+    EXPECT_EQ(Points(reader), (std::vector<double>{1, 2, 3}));
+
+    ZonCldSettings::Instance().SetBool("KeepColors", false);
+    const auto fromFactory = ZonCloudFactoryLeica().CreateReader(Write("q.asc_rgb", "1 2 3 10 20 30\n"));
+    unsigned n = 0;
+    EXPECT_EQ(fromFactory->GetPointColors(n), nullptr);
+    EXPECT_EQ(n, 0u);
+}
+
+TEST_F(RgbPoints, CountLinePresizesTheArrays)
+{
+    ZonCloudReadLeica reader(Write("p.asc_rgb", "5\n1 1 1\n2 2 2\n3 3 3\n4 4 4\n5 5 5\n"));
+    EXPECT_EQ(reader.GetNumberOfPoints(), 5);
+    EXPECT_EQ(reader.GetCapacity(), 5u);
+    EXPECT_EQ(reader.GetDataStartOffset(), 2);
+
+    // Without a count line the room is the size over the average line length.
+    std::string data;
+    for (int i = 0; i < 100; ++i) data += "1 2 3\n";
+    ZonCloudReadLeica estimated(Write("e.asc_rgb", data));
+    EXPECT_EQ(estimated.GetNumberOfPoints(), 100);
+    EXPECT_EQ(estimated.GetCapacity(), 100u);
+}
+
+TEST_F(RgbPoints, EndCloudLineStopsTheReading)
+{
+    ZonCloudReadLeica reader(Write("p.asc_rgb", "1 2 3\n**end cloud**\n4 5 6\n"));
+    EXPECT_EQ(Points(reader), (std::vector<double>{1, 2, 3}));
+}
+
+TEST_F(RgbPoints, DecimalCommaFilesAreReadAfterTwoHundredUnknownLines)
+{
+    // Under the "C" locale a comma stops a number: every line is unknown,
+    // and the 201st makes the reader start again with ',' as decimal point.
+    std::string comma;
+    for (int i = 0; i < 201; ++i) comma += std::to_string(i) + ",5 2,25 3,125 10 20 30\n";
+    ZonCloudReadLeica reader(Write("comma.asc_rgb", comma));
+    const std::vector<double> points = Points(reader);
+    ASSERT_EQ(points.size(), 603u);
+    EXPECT_EQ(points[3], 1.5);
+    EXPECT_EQ(points[5], 3.125);
+    EXPECT_TRUE(reader.IsDecimalPointSwapped());
+    EXPECT_EQ(Colors(reader)[5], 30);
+
+    std::string shorter;
+    for (int i = 0; i < 200; ++i) shorter += "1,5 2,5 3,5\n";
+    ZonCloudReadLeica few(Write("few.asc_rgb", shorter));
+    EXPECT_EQ(ErrorKey([&] { Points(few); }), "ZonCloudReadNLSTool.ERR_NoPointFound");
+
+    std::string junk;
+    for (int i = 0; i < 201; ++i) junk += "no point here\n";
+    ZonCloudReadLeica unknown(Write("junk.asc_rgb", junk + "1 2 3\n"));
+    EXPECT_EQ(ErrorKey([&] { Points(unknown); }), "ZonCloudReadNLSTool.ERR_TooManyUnknownData");
+
+    // A point between unknown lines starts their count again.
+    std::string mixed;
+    for (int i = 0; i < 150; ++i) mixed += "x\n";
+    mixed += "1 2 3\n";
+    for (int i = 0; i < 150; ++i) mixed += "x\n";
+    ZonCloudReadLeica reset(Write("mixed.asc_rgb", mixed));
+    EXPECT_EQ(Points(reset), (std::vector<double>{1, 2, 3}));
+    EXPECT_FALSE(reset.IsDecimalPointSwapped());
+}
+
+TEST_F(RgbPoints, SamplingAndSinglePrecision)
+{
+    std::string data;
+    for (int i = 0; i < 10; ++i) data += std::to_string(i) + ".1 0 0 1 2 3\n";
+    ZonCloudReadLeica reader(Write("p.asc_rgb", data));
+    reader.SetSamplingPercent(50.0f);
+    unsigned n = 0;
+    const float* p = reader.GetPoints(n);
+    ASSERT_EQ(n, 5u);
+    EXPECT_EQ(p[3], 2.1f);
+    EXPECT_EQ(reader.GetNumberOfPoints(), 10);
+    EXPECT_EQ(Colors(reader).size(), 15u);
+}
+
+TEST_F(RgbPoints, WriterBytesAndRoundTrip)
+{
+    const std::string path = (dir_ / "out.asc_rgb").string();
+    ZonCloudWriteLeica writer(path);
+    writer.BeginWritePoints(2);
+    const double a[3] = {1.5, -2, 0.125};
+    const unsigned char rgb[3] = {10, 0, 255};
+    writer.WritePointColorDouble(a, rgb);
+    const float b[3] = {4, 5, 6};
+    writer.WritePoint(b);
+    EXPECT_EQ(ErrorKey([&] { writer.WritePoint(b); }), "ZonCloudReadNLSTool.ERR_Failure");
+    writer.EndWritePoints();
+    EXPECT_EQ(Read(path), "2\n1.500000 -2.000000 0.125000 10 0 255\n4.000000 5.000000 6.000000 255 255 255\n");
+
+    ZonCloudReadLeica reader(path);
+    EXPECT_EQ(Points(reader), (std::vector<double>{1.5, -2, 0.125, 4, 5, 6}));
+    EXPECT_EQ(Colors(reader), (std::vector<int>{10, 0, 255, 255, 255, 255}));
+    EXPECT_EQ(reader.GetCapacity(), 2u);
+
+    writer.BeginWritePoints(3);
+    writer.WritePoint(b);
+    EXPECT_EQ(ErrorKey([&] { writer.EndWritePoints(); }), "ZonCloudReadNLSTool.ERR_Failure");
+}
+
+}  // namespace
