@@ -549,26 +549,35 @@ void ZonCloudReadStl::ReadBinaryMesh()
     _triangles.resize(3 * static_cast<std::size_t>(_triangleCount));
     ZonCloudVertexTable<float> table(_vertices, ExpectedDistinct(_triangleCount));
     std::vector<unsigned char> buffer(kBlockSize - kBlockSize % kRecordSize);
+    // Records are merged in small batches whose table slots are prefetched
+    // together: on big meshes the table does not fit in the cache.
+    constexpr std::size_t kBatch = 16;
+    float corners[kBatch][9];
+    std::uint32_t hashes[kBatch][3];
+    std::size_t batched = 0;
     std::uint32_t* triangle = _triangles.data();
-    const auto merge = [&](const float* corners) {
-        triangle[0] = table.Index(corners);
-        triangle[1] = table.Index(corners + 3);
-        triangle[2] = table.Index(corners + 6);
-        triangle += 3;
+    const auto flush = [&] {
+        for (std::size_t r = 0; r < batched; ++r)
+            for (int k = 0; k < 3; ++k) {
+                hashes[r][k] = table.HashOf(corners[r] + 3 * k);
+                table.Prefetch(hashes[r][k]);
+            }
+        for (std::size_t r = 0; r < batched; ++r)
+            for (int k = 0; k < 3; ++k) *triangle++ = table.Index(corners[r] + 3 * k, hashes[r][k]);
+        batched = 0;
     };
     std::uint64_t stored;
     if (_nativeOrder)
         stored = ForEachRecord(_file, _triangleCount, buffer, [&](const unsigned char* record) {
-            float corners[9];
-            LoadCorners<false>(record, corners);
-            merge(corners);
+            LoadCorners<false>(record, corners[batched]);
+            if (++batched == kBatch) flush();
         });
     else
         stored = ForEachRecord(_file, _triangleCount, buffer, [&](const unsigned char* record) {
-            float corners[9];
-            LoadCorners<true>(record, corners);
-            merge(corners);
+            LoadCorners<true>(record, corners[batched]);
+            if (++batched == kBatch) flush();
         });
+    flush();
     _triangles.resize(3 * static_cast<std::size_t>(stored));
     ShrinkIfLoose(_vertices);
     _distinctCount = _vertices.size() / 3;

@@ -13,7 +13,7 @@
 // a NaN is always a vertex of its own), and no tolerance is applied. Vertices
 // are numbered in order of first appearance and appended to the caller's
 // array; the table itself holds only indices and hashes (open addressing,
-// linear probing, at most half full).
+// linear probing, at most five eighths full).
 template <class T>
 class ZonCloudVertexTable {
     static_assert(std::is_same_v<T, float> || std::is_same_v<T, double>);
@@ -24,17 +24,24 @@ public:
     ZonCloudVertexTable(std::vector<T>& vertices, std::size_t expectedDistinct) : _vertices(vertices)
     {
         std::size_t size = 16;
-        while (size < 2 * expectedDistinct) size *= 2;
+        while (IsCrowded(expectedDistinct, size)) size *= 2;
         _slots.resize(size);
         _mask = size - 1;
     }
 
     // The index of the vertex at xyz[0..2], appended when new.
-    std::uint32_t Index(const T* xyz)
+    std::uint32_t Index(const T* xyz) { return Index(xyz, HashOf(xyz)); }
+
+    // For callers that look up many vertices in a row: hash them all and
+    // prefetch their slots first, so that the cache misses overlap, then call
+    // Index with each hash in the order of the vertices.
+    static std::uint32_t HashOf(const T* xyz) { return Hash(xyz[0], xyz[1], xyz[2]); }
+    void Prefetch(std::uint32_t hash) const { __builtin_prefetch(_slots.data() + (hash & _mask)); }
+
+    std::uint32_t Index(const T* xyz, std::uint32_t hash)
     {
         const T x = xyz[0], y = xyz[1], z = xyz[2];
         if (x != x || y != y || z != z) return Append(x, y, z);
-        const std::uint32_t hash = Hash(x, y, z);
         std::size_t i = hash & _mask;
         for (;; i = (i + 1) & _mask) {
             const Slot slot = _slots[i];
@@ -44,7 +51,7 @@ public:
             if (v[0] == x && v[1] == y && v[2] == z) return slot.index1 - 1;
         }
         const std::uint32_t index = Append(x, y, z);
-        if (2 * (_used + 1) > _slots.size()) {
+        if (IsCrowded(_used + 1, _slots.size())) {
             Grow();
             for (i = hash & _mask; _slots[i].index1 != 0; i = (i + 1) & _mask) {
             }
@@ -61,6 +68,8 @@ private:
         std::uint32_t index1 = 0;  // vertex index + 1; 0 marks a free slot
         std::uint32_t hash = 0;
     };
+
+    static bool IsCrowded(std::size_t used, std::size_t size) { return 8 * used > 5 * size; }
 
     std::uint32_t Append(T x, T y, T z)
     {
