@@ -2,6 +2,7 @@
 // factory options, and the fixed-width writer whose files read back.
 #include <gtest/gtest.h>
 
+#include <cmath>
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
@@ -12,6 +13,7 @@
 #include "ZonCldSettings.h"
 #include "ZonCloudFactoryAsciiUserFormat.h"
 #include "ZonCloudReadAsciiUserFormat.h"
+#include "ZonCloudScanFormat.h"
 #include "ZonCloudWriteAsciiUserFormat.h"
 #include "ZonError.h"
 
@@ -119,6 +121,38 @@ TEST_F(AsciiUserFormat, DecimalCommasAndPointsGiveTheSamePoint)
 {
     EXPECT_EQ(Points(*Reader("X Y Z", "1,5 2,5 3,5\r\n1.5 2.5 3.5\r\n")),
               (std::vector<double>{1.5, 2.5, 3.5, 1.5, 2.5, 3.5}));
+}
+
+TEST_F(AsciiUserFormat, ColumnsConvertAsScanfWould)
+{
+    // Real columns read "%le" and integer columns "%d" of the token, whatever
+    // shortcut the reader takes; a column that does not convert reads 0 here.
+    const char* tokens[] = {"1e5", "-2.5E-3", "+7", "0x1A", "inf", "-", "12abc", "1e", ".5", "007", "1,5e1",
+                            "99999999999", "-2147483648", "2147483648", "nan", "1.2.3", "--1", "e3"};
+    for (const char* token : tokens) {
+        const auto reader = Reader("X Y Z", std::string(token) + " 0 0 \r\n");
+        unsigned n = 0;
+        const double* p = reader->GetPointsDouble(n);
+        ASSERT_EQ(n, 1u) << token;
+        std::string text = token;
+        for (char& c : text)
+            if (c == ',') c = '.';
+        double x = 0.0;
+        ZonScan(text.c_str(), '.', "%le", &x);
+        if (std::isnan(x))
+            EXPECT_TRUE(std::isnan(p[0])) << token;
+        else
+            EXPECT_EQ(p[0], x) << token;
+    }
+    for (const char* token : tokens) {
+        std::int32_t expected = 0;
+        if (ZonScan(token, '.', "%d", &expected) != 1 || static_cast<std::uint32_t>(expected) > 255u) continue;
+        const auto reader = Reader("X Y Z R G B", std::string("0 0 0 ") + token + " 0 0 \r\n");
+        unsigned n = 0;
+        const unsigned char* rgb = reader->GetPointColors(n);
+        ASSERT_EQ(n, 1u) << token;
+        EXPECT_EQ(rgb[0], expected) << token;
+    }
 }
 
 TEST_F(AsciiUserFormat, ExclamationMarkStartsACommentOnlyInTheFirstToken)

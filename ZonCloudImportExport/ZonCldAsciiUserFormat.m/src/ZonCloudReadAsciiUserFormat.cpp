@@ -54,6 +54,74 @@ int Tokenize(char* line, char* tokens[], int maxTokens)
     return n;
 }
 
+// A data line's token, split in place; whether it holds a double quote is
+// noted on the way, so quoted texts cost nothing to lines without them.
+struct Token {
+    char* text;
+    int length;
+    bool quoted;
+};
+
+int TokenizeData(char* line, Token tokens[], int maxTokens)
+{
+    int n = 0;
+    char* p = line;
+    while (*p && n < maxTokens) {
+        while (*p && IsSeparator(*p)) ++p;
+        if (!*p) break;
+        char* start = p;
+        bool quoted = false;
+        while (*p && !IsSeparator(*p)) {
+            quoted |= *p == '"';
+            ++p;
+        }
+        tokens[n++] = {start, static_cast<int>(p - start), quoted};
+        if (*p) *p++ = '\0';
+    }
+    return n;
+}
+
+// A real column: a decimal comma reads as a point. Parsing with '.' gives
+// what the locale's own decimal point would after the same swap. Tokens made
+// only of digits, signs, points and exponent letters read the same under
+// strtod's rules as under scanf's "%le", and skip the general scan.
+double ReadReal(const Token& token)
+{
+    static const ZonCloudScanFormat realFormat("%le");
+    bool simple = true;
+    for (int i = 0; i < token.length; ++i) {
+        char& c = token.text[i];
+        if (c == ',') c = '.';
+        const bool plain = (c >= '0' && c <= '9') || c == '.' || c == '-' || c == '+' || c == 'e' || c == 'E';
+        simple &= plain;
+    }
+    double value = 0.0;
+    if (simple)
+        ZonParseDouble(token.text, token.text + token.length, '.', value);
+    else
+        realFormat(token.text, '.', &value);
+    return value;
+}
+
+// An integer column, converted as "%d" would; the target keeps its value when
+// nothing converts. Short runs of digits skip the general scan.
+void ReadInteger(const Token& token, std::int32_t& target)
+{
+    static const ZonCloudScanFormat integerFormat("%d");
+    const char* p = token.text;
+    const char* end = token.text + token.length;
+    const bool negative = *p == '-';
+    if (*p == '-' || *p == '+') ++p;
+    const char* digits = p;
+    std::int32_t value = 0;
+    while (p < end && p - digits < 9 && *p >= '0' && *p <= '9') value = value * 10 + (*p++ - '0');
+    if (p > digits && (p == end || !(*p >= '0' && *p <= '9'))) {
+        target = negative ? -value : value;
+        return;
+    }
+    integerFormat(token.text, '.', &target);
+}
+
 template <class T>
 void ReserveOrThrow(std::vector<T>& v, std::uint64_t n)
 {
@@ -295,9 +363,6 @@ void ZonCloudReadAsciiUserFormat::Load(bool asDouble)
 
 void ZonCloudReadAsciiUserFormat::ParseLine(char* line, LineValues& values, bool& complete)
 {
-    static const ZonCloudScanFormat realFormat("%le");
-    static const ZonCloudScanFormat integerFormat("%d");
-
     values.x = values.y = values.z = 0.0;
     values.r = 0;
     values.g = 255;
@@ -308,76 +373,72 @@ void ZonCloudReadAsciiUserFormat::ParseLine(char* line, LineValues& values, bool
     complete = false;
 
     CutBeforeNewline(line);
-    char* tokens[MaxTokens];
-    const int tokenCount = Tokenize(line, tokens, MaxTokens);
-    if (tokenCount == 0 || tokens[0][0] == '!') return;
+    Token tokens[MaxTokens];
+    const int tokenCount = TokenizeData(line, tokens, MaxTokens);
+    if (tokenCount == 0 || tokens[0].text[0] == '!') return;
 
     const std::size_t fieldCount = _fields.size();
     std::size_t field = 0;
     int t = 0;
     std::string quoted;
     for (; field < fieldCount && t < tokenCount; ++field, ++t) {
-        char* token = tokens[t];
+        const Token& token = tokens[t];
         quoted.clear();
-        if (const char* open = std::strchr(token, '"')) {
+        if (token.quoted) {
             // A quoted text may run over several tokens; those take no column.
-            const char* rest = open + 1;
+            const char* rest = std::strchr(token.text, '"') + 1;
             if (const char* close = std::strchr(rest, '"')) {
                 quoted.assign(rest, close);
             } else {
                 quoted.assign(rest);
                 while (t + 1 < tokenCount) {
-                    const char* next = tokens[++t];
+                    const Token& next = tokens[++t];
                     quoted += ' ';
-                    if (const char* end = std::strchr(next, '"')) {
-                        quoted.append(next, end);
+                    if (next.quoted) {
+                        quoted.append(next.text, std::strchr(next.text, '"'));
                         break;
                     }
-                    quoted += next;
+                    quoted.append(next.text, next.length);
                 }
             }
         }
         switch (_fields[field]) {
             case FieldX:
+                values.x = ReadReal(token);
+                break;
             case FieldY:
+                values.y = ReadReal(token);
+                break;
             case FieldZ:
+                values.z = ReadReal(token);
+                break;
             case FieldDX:
             case FieldDY:
-            case FieldDZ: {
-                // A decimal comma reads as a point. Parsing with '.' gives what
-                // the locale's own decimal point would after the same swap.
-                for (char* c = token; *c; ++c)
-                    if (*c == ',') *c = '.';
-                double value = 0.0;
-                realFormat(token, '.', &value);
-                const int code = _fields[field];
-                if (code == FieldX) values.x = value;
-                else if (code == FieldY) values.y = value;
-                else if (code == FieldZ) values.z = value;
+            case FieldDZ:
+                ReadReal(token);  // directions are read, not kept
                 break;
-            }
             case FieldR:
-                integerFormat(token, '.', &values.r);
+                ReadInteger(token, values.r);
                 ++values.colorCounter;
                 break;
             case FieldG:
-                integerFormat(token, '.', &values.g);
+                ReadInteger(token, values.g);
                 ++values.colorCounter;
                 break;
             case FieldB:
-                integerFormat(token, '.', &values.b);
+                ReadInteger(token, values.b);
                 ++values.colorCounter;
                 break;
             case FieldA:
-                integerFormat(token, '.', &values.a);
+                ReadInteger(token, values.a);
                 _hasAlpha = true;
                 break;
             case FieldColor:
-                integerFormat(token, '.', &_colorIndex);
+                ReadInteger(token, _colorIndex);
                 values.colorCounter = 4;
                 break;
             case FieldSymbol:
-                integerFormat(token, '.', &_symbolIndex);
+                ReadInteger(token, _symbolIndex);
                 _hasSymbol = true;
                 break;
             case FieldText:
