@@ -311,8 +311,10 @@ TEST_F(AsciiWriterTest, PointsUseADotUnderACommaLocale)
 
 ZonICloudReadFile_var CreateAsciiReader(const std::string& path)
 {
-    auto factory = ZonCldImporter::GetFactory(ZonCloudReadNLSTool::NameOfFormat("CloudFactoryAsciiLibre"));
-    return factory ? factory->CreateReader(ZonUnicodeString(path)) : nullptr;
+    for (const auto& factory : ZonCldImporter::GetAllFactories())
+        if (std::string(factory->GetRegistryName()) == "CloudFactoryAsciiLibre")
+            return factory->CreateReader(ZonUnicodeString(path));
+    return nullptr;
 }
 
 std::vector<std::vector<double>> ScansOf(const ZonICloudReadFile_var& reader)
