@@ -201,7 +201,8 @@ ZonToolRun ZonToolAddDump(CLI::App& app)
     auto json = std::make_shared<bool>(false);
     options->AddTo(*command);
     command->add_flag("--json", *json, "Report errors as JSON too (the answers always are)");
-    return [options]() -> int {
+    // The flag is read by the error handler of main; the run keeps it alive.
+    return [options, json]() -> int {
         options->ApplyToSettings();
         std::string formatName;
         const ZonICloudReadFile_var reader = options->CreateReader(formatName);
