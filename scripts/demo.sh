@@ -3,3 +3,18 @@
 set -euo pipefail
 build=${1:-build}
 "$build/zoncloud" formats
+
+# Convert the bundled scans into a free ASCII file, as a user would, and show it.
+sample=samples/scans.asc
+if [ -f "$sample" ]; then
+  out="$build/demo"
+  mkdir -p "$out"
+  echo
+  echo "== zoncloud convert $sample $out/scans.asc --delimiters G08 G09"
+  "$build/zoncloud" convert "$sample" "$out/scans.asc" --delimiters G08 G09
+  echo "-- first lines of $out/scans.asc:"
+  head -n 14 "$out/scans.asc"
+  echo "-- $(grep -c '^G08' "$out/scans.asc") scans, $(grep -c '^X ' "$out/scans.asc") points"
+else
+  echo "no sample at $sample: nothing to convert" >&2
+fi
