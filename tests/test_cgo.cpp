@@ -14,7 +14,13 @@
 #include "ZonCloudFactoryCgoAscii.h"
 #include "ZonCloudReadCgoAscii.h"
 #include "ZonCloudWriteCgoAscii.h"
+#include "ZonCldCgoOutputDocument.h"
 #include "ZonError.h"
+#include "ZonExchMemoryDocument.h"
+#include "ZonExchMemoryTessFace.h"
+#include "ZonExchMemoryTessNode.h"
+#include "ZonExchMemoryTessRep.h"
+#include "ZonIExchTessRep.h"
 
 namespace fs = std::filesystem;
 
@@ -170,6 +176,38 @@ TEST_F(Cgo, MultiPartFileGetsItsTotalOnThePlaceholderLine)
 
     ZonCloudWriteCgoAscii nowhere((dir_ / "no" / "such" / "dir.cgo").string());
     EXPECT_EQ(nowhere.BeginMultiWrite(), ZON_E_FAIL);
+}
+
+TEST_F(Cgo, OutputDocumentOverwritesItsPlaceholderWithTheCount)
+{
+    auto face = std::make_shared<ZonExchMemoryTessFace>();
+    face->SetCoords({1, 2, 3, 4, 5, 6, 7, 8, 9});
+    auto node = std::make_shared<ZonExchMemoryTessNode>(ZonExchNodeCloud);
+    node->SetPosition({1, 0, 0, 0, 1, 0, 0, 0, 1}, {0, 0, 1});
+    node->AddFace(face);
+    auto rep = std::make_shared<ZonExchMemoryTessRep>();
+    rep->AddTopNode(node);
+    auto document = std::make_shared<ZonExchMemoryDocument>();
+    document->SetRepresentation(ZonIExchTessRep::RepresentationType, rep);
+
+    const std::string path = (dir_ / "doc.cgo").string();
+    ZonCldCgoOutputDocument output;
+    output.SetFileName(path);
+    output.SetOptions({"Scaling"}, {"0"});  // 0 leaves the coordinates as they are
+    ASSERT_EQ(output.Open(), ZON_S_OK);
+    ASSERT_EQ(output.Write(document), ZON_S_OK);
+    ASSERT_EQ(output.Close(), ZON_S_OK);
+    EXPECT_EQ(Read(path),
+              "3           \n1.000000 2.000000 4.000000\n4.000000 5.000000 7.000000\n"
+              "7.000000 8.000000 10.000000\n**end cloud**\n");
+    ZonCloudReadCgoAscii reader(path);
+    EXPECT_EQ(Points(reader), (std::vector<double>{1, 2, 4, 4, 5, 7, 7, 8, 10}));
+    EXPECT_EQ(reader.GetCapacity(), 3u);
+
+    ZonCldCgoOutputDocument nowhere;
+    EXPECT_EQ(nowhere.Open(), ZON_E_FAIL);
+    nowhere.SetFileName((dir_ / "no" / "dir.cgo").string());
+    EXPECT_EQ(nowhere.Open(), ZON_E_FAIL);
 }
 
 }  // namespace

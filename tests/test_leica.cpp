@@ -14,7 +14,18 @@
 #include "ZonCloudFactoryLeica.h"
 #include "ZonCloudReadLeica.h"
 #include "ZonCloudWriteLeica.h"
+#include "ZonCldLeicaOutputDocument.h"
 #include "ZonError.h"
+#include "ZonExchMemoryDocument.h"
+#include "ZonExchMemoryInstance.h"
+#include "ZonExchMemoryPointFace.h"
+#include "ZonExchMemoryProduct.h"
+#include "ZonExchMemoryProductStructure.h"
+#include "ZonExchMemoryTessNode.h"
+#include "ZonExchMemoryTessRep.h"
+#include "ZonIExchProductStructure.h"
+#include "ZonIReporter.h"
+#include "ZonObjectRegistry.h"
 
 namespace fs = std::filesystem;
 
@@ -202,6 +213,64 @@ TEST_F(RgbPoints, WriterBytesAndRoundTrip)
     writer.BeginWritePoints(3);
     writer.WritePoint(b);
     EXPECT_EQ(ErrorKey([&] { writer.EndWritePoints(); }), "ZonCloudReadNLSTool.ERR_Failure");
+}
+
+TEST_F(RgbPoints, OutputDocumentPlacesScalesAndColoursThePoints)
+{
+    // A cloud with a colour per point, moved by its node, and a scan with the
+    // representation's one colour, under an instance that turns and shifts.
+    auto colored = std::make_shared<ZonExchMemoryPointFace>();
+    colored->SetCoords({1, 2, 3, 4, 5, 6});
+    colored->SetPointColors({10, 20, 30, 40, 50, 60});
+    auto cloud = std::make_shared<ZonExchMemoryTessNode>(ZonExchNodeCloud);
+    cloud->SetPosition({1, 0, 0, 0, 1, 0, 0, 0, 1}, {1, 0, 0});
+    cloud->AddFace(colored);
+    auto single = std::make_shared<ZonExchMemoryPointFace>();
+    single->SetCoords({0, 0, 1});
+    single->SetSingleColor(7, 8, 9);
+    auto scan = std::make_shared<ZonExchMemoryTessNode>(ZonExchNodeScan);
+    scan->AddFace(single);
+    auto plain = std::make_shared<ZonExchMemoryTessFace>();
+    plain->SetCoords({0.5f, 0, 0});
+    auto grid = std::make_shared<ZonExchMemoryTessNode>(ZonExchNodeGrid);
+    grid->AddFace(plain);
+    auto rep = std::make_shared<ZonExchMemoryTessRep>();
+    for (const auto& node : {cloud, scan, grid}) rep->AddTopNode(node);
+    auto part = std::make_shared<ZonExchMemoryProduct>();
+    part->SetTessellatedRep(rep);
+    auto root = std::make_shared<ZonExchMemoryProduct>();
+    root->AddInstance(std::make_shared<ZonExchMemoryInstance>(
+        part, ZonMathTransformation({0, -1, 0, 1, 0, 0, 0, 0, 1}, {0, 0, 10})));
+    auto structure = std::make_shared<ZonExchMemoryProductStructure>();
+    structure->AddRoot(root);
+    auto document = std::make_shared<ZonExchMemoryDocument>();
+    document->SetRepresentation(ZonIExchProductStructure::RepresentationType, structure);
+
+    auto reporter = std::make_shared<ZonCollectingReporter>();
+    ZonSession::GetPtrSession()->SetReporter(reporter);
+    const auto output = ZonQueryInterface<ZonIExchOutputDocument>(
+        ZonObjectRegistry::CreateByLateType("CLD_AsciiRGB_OutputDocument"));
+    ASSERT_NE(output, nullptr);
+    const std::string path = (dir_ / "doc.asc_rgb").string();
+    EXPECT_EQ(output->Open(), ZON_E_FAIL);  // no file name yet
+    EXPECT_EQ(output->SetFileName(path), ZON_S_OK);
+    EXPECT_EQ(output->SetOptions({"Scaling"}, {}), ZON_E_FAIL);
+    EXPECT_EQ(output->SetOptions({"Scaling", "Precision"}, {"2", "precUnknown"}), ZON_S_OK);
+    EXPECT_EQ(output->Open(), ZON_S_OK);
+    EXPECT_EQ(output->Write(document), ZON_S_OK);
+    EXPECT_EQ(output->Release(), ZON_S_OK);
+    EXPECT_EQ(Read(path),
+              "-4.000000 4.000000 26.000000 10 20 30 \n"
+              "-10.000000 10.000000 32.000000 40 50 60 \n"
+              "0.000000 0.000000 22.000000 7 8 9 \n"
+              "0.000000 1.000000 20.000000\n");
+    ASSERT_EQ(reporter->Entries().size(), 1u);
+    EXPECT_EQ(reporter->Entries()[0].key, "ZonCldExportCmd.ERR_FILESUCCESSFULL");
+
+    // The file reads back: six values give the colour, three give white.
+    ZonCloudReadLeica reader(path);
+    EXPECT_EQ(Colors(reader), (std::vector<int>{10, 20, 30, 40, 50, 60, 7, 8, 9, 255, 255, 255}));
+    ZonSession::GetPtrSession()->SetReporter(std::make_shared<ZonStderrReporter>());
 }
 
 }  // namespace
