@@ -16,6 +16,7 @@
 #include "ZonIExchExporter.h"
 #include "ZonIReporter.h"
 #include "ZonObjectRegistry.h"
+#include "ZonToolPointFormats.h"
 
 namespace {
 
@@ -25,6 +26,7 @@ struct ConvertOptions {
     bool binary = false;
     std::optional<double> scale;
     bool doublePrecision = false;
+    ZonToolUserFormatOptions userFormat;
 };
 
 // Shows the outcome messages as the host does, one line each.
@@ -212,6 +214,18 @@ const std::vector<Target>& Targets()
              return WriteFreeAscii(body, file, options);
          }},
         {{".stl"}, WriteStl},
+        {{".asc_fmt"},
+         [](const ZonCldBody& body, const std::string& file, const ConvertOptions& options, const std::string&) {
+             return ZonToolWriteUserFormat(body, file, options.userFormat);
+         }},
+        {{".asc_rgb", ".xyz_rgb"},
+         [](const ZonCldBody& body, const std::string& file, const ConvertOptions&, const std::string&) {
+             return ZonToolWriteRgbPoints(body, file);
+         }},
+        {{".cgo"},
+         [](const ZonCldBody& body, const std::string& file, const ConvertOptions&, const std::string&) {
+             return ZonToolWriteCgo(body, file);
+         }},
     };
     return targets;
 }
@@ -233,12 +247,13 @@ ZonToolRun ZonToolAddConvert(CLI::App& app)
     auto options = std::make_shared<ZonToolReaderOptions>();
     auto convert = std::make_shared<ConvertOptions>();
     options->AddTo(*command);
-    command->add_option("OUT", convert->output, "File to write; its extension chooses the format (.asc .libre .ascii .stl)")
+    command->add_option("OUT", convert->output, "File to write; its extension chooses the format (.asc .libre .ascii .stl .asc_fmt .asc_rgb .xyz_rgb .cgo)")
         ->required();
     auto* text = command->add_flag("--text", convert->text, "STL: write the text form");
     auto* binary = command->add_flag("--binary", convert->binary, "STL: write the binary form (the default)");
     text->excludes(binary);
     command->add_option("--scale", convert->scale, "STL: factor applied to every coordinate written");
+    convert->userFormat.AddTo(*command);
     return [options, convert]() -> int {
         options->ApplyToSettings();
         convert->doublePrecision = options->doublePrecision;
