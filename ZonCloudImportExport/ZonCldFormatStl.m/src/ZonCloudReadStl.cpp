@@ -48,6 +48,28 @@ using Tool = ZonCloudReadNLSTool;
     Tool::Raise(type, nullptr);
 }
 
+// Size of the file, or -1 when the system cannot tell.
+std::int64_t FileSize(FILE* file)
+{
+    struct stat info {};
+    return fstat(fileno(file), &info) == 0 ? static_cast<std::int64_t>(info.st_size) : -1;
+}
+
+// Big blocks for big files, no more than needed for small ones.
+std::size_t BlockSize(FILE* file, std::size_t largest)
+{
+    const std::int64_t size = FileSize(file);
+    if (size < 0) return largest;
+    return std::min<std::size_t>(largest, std::max<std::size_t>(static_cast<std::size_t>(size) + 1, 4096));
+}
+
+// A whole number of records.
+std::size_t RecordBlockSize(FILE* file)
+{
+    const std::size_t size = BlockSize(file, kBlockSize) + kRecordSize;
+    return size - size % kRecordSize;
+}
+
 std::size_t ReadBytes(FILE* file, void* buffer, std::size_t size)
 {
     errno = 0;
@@ -315,7 +337,7 @@ bool ZonCloudReadStl::IsTextCandidate()
 bool ZonCloudReadStl::HasVertexLineNearStart()
 {
     SeekFile(0);
-    LineSource lines(_file, 64 * 1024);
+    LineSource lines(_file, BlockSize(_file, 64 * 1024));
     const char* first = nullptr;
     const char* last = nullptr;
     for (int without = 0; without < kKindTestLines && lines.Next(first, last); ++without)
@@ -329,7 +351,7 @@ void ZonCloudReadStl::AnalyseText()
     bool otherTried = false;
     for (;;) {
         SeekFile(0);
-        LineSource lines(_file, kBlockSize);
+        LineSource lines(_file, BlockSize(_file, kBlockSize));
         BoxAccumulator<double> box;
         std::uint64_t found = 0;
         int failures = 0;
@@ -383,8 +405,7 @@ void ZonCloudReadStl::AnalyseBinary()
     if (ReadBytes(_file, &stored, sizeof stored) < sizeof stored) RaiseShortRead(_file, Tool::Input);
     const auto reversed = static_cast<std::int32_t>(__builtin_bswap32(static_cast<std::uint32_t>(stored)));
 
-    struct stat info {};
-    const std::int64_t size = fstat(fileno(_file), &info) == 0 ? static_cast<std::int64_t>(info.st_size) : -1;
+    const std::int64_t size = FileSize(_file);
     const std::int64_t fits = size > 0 ? (size - 84) / static_cast<std::int64_t>(kRecordSize) : -1;
 
     const CountChoice choice = ChooseCount(stored, reversed, fits);
@@ -393,7 +414,7 @@ void ZonCloudReadStl::AnalyseBinary()
     if (choice.count < 0) Tool::Raise(Tool::Data, "ERR_UnknownData");
 
     // The count word is only a bound: what counts is what the file holds.
-    std::vector<unsigned char> buffer(kBlockSize - kBlockSize % kRecordSize);
+    std::vector<unsigned char> buffer(RecordBlockSize(_file));
     BoxAccumulator<float> box;
     const auto widen = [&box](const float* corners) {
         box.Add(corners);
@@ -516,7 +537,7 @@ void ZonCloudReadStl::ReadTextMesh(std::vector<T>& vertices)
     vertices.reserve(3 * ExpectedDistinct(_triangleCount));
     _triangles.resize(3 * static_cast<std::size_t>(_triangleCount));
     ZonCloudVertexTable<T> table(vertices, ExpectedDistinct(_triangleCount));
-    LineSource lines(_file, kBlockSize);
+    LineSource lines(_file, BlockSize(_file, kBlockSize));
     T corners[9];
     int pending = 0;
     std::size_t stored = 0;
@@ -548,7 +569,7 @@ void ZonCloudReadStl::ReadBinaryMesh()
     _vertices.reserve(3 * ExpectedDistinct(_triangleCount));
     _triangles.resize(3 * static_cast<std::size_t>(_triangleCount));
     ZonCloudVertexTable<float> table(_vertices, ExpectedDistinct(_triangleCount));
-    std::vector<unsigned char> buffer(kBlockSize - kBlockSize % kRecordSize);
+    std::vector<unsigned char> buffer(RecordBlockSize(_file));
     // Records are merged in small batches whose table slots are prefetched
     // together: on big meshes the table does not fit in the cache.
     constexpr std::size_t kBatch = 16;
