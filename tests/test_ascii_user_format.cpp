@@ -3,6 +3,7 @@
 #include <gtest/gtest.h>
 
 #include <cmath>
+#include <cstdio>
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
@@ -16,6 +17,8 @@
 #include "ZonCloudScanFormat.h"
 #include "ZonCloudWriteAsciiUserFormat.h"
 #include "ZonError.h"
+
+#include <nlohmann/json.hpp>
 
 namespace fs = std::filesystem;
 
@@ -413,6 +416,45 @@ TEST_F(AsciiUserFormat, WrittenFilesReadBackWithAnFdfNamingTheColumns)
     const unsigned char* rgb = reader.GetPointColors(n);
     ASSERT_EQ(n, 2u);
     EXPECT_EQ(std::vector<int>(rgb, rgb + 6), (std::vector<int>{1, 2, 3, 250, 128, 0}));
+}
+
+// The tool: dump shows the per-point arrays, convert writes the layout asked for.
+std::string RunTool(const std::string& arguments, int& status)
+{
+    std::string output;
+    const std::string command = std::string("'") + ZON_TOOL_PATH + "' " + arguments + " 2>&1 </dev/null";
+    FILE* pipe = ::popen(command.c_str(), "r");
+    if (!pipe) return output;
+    char buffer[4096];
+    while (const std::size_t n = std::fread(buffer, 1, sizeof buffer, pipe)) output.append(buffer, n);
+    status = ::pclose(pipe);
+    return output;
+}
+
+TEST_F(AsciiUserFormat, ToolDumpsTheArraysAndConvertsBackAndForth)
+{
+    const std::string fdf = Write("c.fdf", "X Y Z R G B A SYMBOL TEXT\r\n");
+    const std::string data = Write("p.asc_fmt", "1 2 3 10 20 30 40 5 \"a b\"\r\n4 5 6 7 8 9 50 6 \"c\"\r\n");
+    int status = -1;
+    const std::string json = RunTool("dump --json --fdf '" + fdf + "' '" + data + "'", status);
+    ASSERT_EQ(status, 0) << json;
+    const auto cloud = nlohmann::json::parse(json)["cloud"];
+    EXPECT_EQ(cloud["colors"], nlohmann::json::parse("[[10,20,30],[7,8,9]]"));
+    EXPECT_EQ(cloud["alpha"], nlohmann::json::parse("[40,50]"));
+    EXPECT_EQ(cloud["symbols"], nlohmann::json::parse("[5,6]"));
+    EXPECT_EQ(cloud["texts"], nlohmann::json::parse(R"(["/a b%","/c%"])"));
+
+    const std::string out = (dir_ / "out.asc_fmt").string();
+    const std::string report = RunTool("convert --fdf '" + fdf + "' '" + data + "' '" + out +
+                                           "' --auf-numbers Y --auf-width 8 --auf-decimals 1 --auf-row-sep N",
+                                       status);
+    ASSERT_EQ(status, 0) << report;
+    EXPECT_EQ(Read(out), "      1     1.0     2.0     3.0      10      20      30\r\n"
+                         "      2     4.0     5.0     6.0       7       8       9\r\n");
+    const std::string back = Write("back.fdf", "LABEL X Y Z R G B\r\n");
+    const std::string again = RunTool("dump --json --fdf '" + back + "' '" + out + "'", status);
+    ASSERT_EQ(status, 0) << again;
+    EXPECT_EQ(nlohmann::json::parse(again)["cloud"]["points"], nlohmann::json::parse("[[1,2,3],[4,5,6]]"));
 }
 
 }  // namespace

@@ -215,6 +215,19 @@ TEST_F(RgbPoints, WriterBytesAndRoundTrip)
     EXPECT_EQ(ErrorKey([&] { writer.EndWritePoints(); }), "ZonCloudReadNLSTool.ERR_Failure");
 }
 
+TEST_F(RgbPoints, ToolConvertsToRgbAndCgoFiles)
+{
+    const std::string in = Write("in.xyz_rgb", "1 2 3 10 20 30\n4 5 6\n");
+    const std::string rgb = (dir_ / "out.asc_rgb").string();
+    const std::string cgo = (dir_ / "out.cgo").string();
+    for (const std::string& out : {rgb, cgo}) {
+        const std::string command = std::string("'") + ZON_TOOL_PATH + "' convert '" + in + "' '" + out + "' >/dev/null 2>&1";
+        ASSERT_EQ(std::system(command.c_str()), 0) << out;
+    }
+    EXPECT_EQ(Read(rgb), "2\n1.000000 2.000000 3.000000 10 20 30\n4.000000 5.000000 6.000000 255 255 255\n");
+    EXPECT_EQ(Read(cgo), "2\n1.000000 2.000000 3.000000\n4.000000 5.000000 6.000000\n**end cloud**\n");
+}
+
 TEST_F(RgbPoints, OutputDocumentPlacesScalesAndColoursThePoints)
 {
     // A cloud with a colour per point, moved by its node, and a scan with the
