@@ -90,11 +90,18 @@ unsigned Count32(std::size_t count)
     return static_cast<unsigned>(count);
 }
 
-void WritePoints(ZonCloudWriteAsciiLibre& writer, const ZonCldPointArray& points, const unsigned char* valid = nullptr)
+// A grid point without a validity byte counts as a hole.
+bool IsValid(const std::vector<unsigned char>* valid, std::size_t i)
+{
+    return !valid || (i < valid->size() && (*valid)[i]);
+}
+
+void WritePoints(ZonCloudWriteAsciiLibre& writer, const ZonCldPointArray& points,
+                 const std::vector<unsigned char>* valid = nullptr)
 {
     const std::size_t n = points.GetNumberOfPoints();
     for (std::size_t i = 0; i < n; ++i) {
-        if (valid && !valid[i]) continue;
+        if (!IsValid(valid, i)) continue;
         if (points.IsDoublePrecision()) writer.WritePointDouble(points.GetDoubles().data() + 3 * i);
         else writer.WritePoint(points.GetFloats().data() + 3 * i);
     }
@@ -103,7 +110,7 @@ void WritePoints(ZonCloudWriteAsciiLibre& writer, const ZonCldPointArray& points
 std::size_t ValidPoints(const ZonCldGrid::Row& row)
 {
     std::size_t n = 0;
-    for (std::size_t i = 0; i < row.points.GetNumberOfPoints(); ++i) n += (i < row.valid.size() && row.valid[i]) ? 1 : 0;
+    for (std::size_t i = 0; i < row.points.GetNumberOfPoints(); ++i) n += IsValid(&row.valid, i) ? 1 : 0;
     return n;
 }
 
@@ -114,8 +121,7 @@ void WriteLoosePoints(ZonCloudWriteAsciiLibre& writer, const ZonCldBody& body, s
     for (const auto& cloud : body.GetClouds()) WritePoints(writer, cloud->Points());
     for (const auto& set : body.GetSetsOfGrids())
         for (const auto& grid : set->GetGrids())
-            for (const auto& row : grid->GetRows())
-                if (row.valid.size() >= row.points.GetNumberOfPoints()) WritePoints(writer, row.points, row.valid.data());
+            for (const auto& row : grid->GetRows()) WritePoints(writer, row.points, &row.valid);
     for (const auto& polygon : body.GetPolygons()) WritePoints(writer, polygon->Vertices());
     writer.EndWritePoints();
 }

@@ -541,18 +541,20 @@ TEST_F(StlWriterTest, WriterAddsEachAnnouncementToTheCount)
     EXPECT_EQ(std::string(stl.header.data()), "STL " + ZonCloudReadNLSTool::GeneratedBy().ToUtf8());
 }
 
-TEST_F(StlWriterTest, WriterInTheReversedByteOrderSwapsEveryNumber)
+TEST_F(StlWriterTest, WriterInTheReversedByteOrderSwapsEveryNumberAlsoInAMultiPartFile)
 {
     const std::string path = Path("reversed.stl");
     const float a[9] = {0, 0, 0, 1, 0, 0, 0, 1, 0};
     {
         ZonCloudWriteStl writer(path);
         writer.SetReverseByteOrder(true);
+        ASSERT_EQ(writer.BeginMultiWrite(), ZON_S_OK);
         writer.BeginWriteTriangles(1);
         writer.WriteTriangle(a);
         writer.BeginWriteTriangles(1);
         writer.WriteTriangle(a);
         writer.EndWriteTriangles();
+        writer.EndMultiWrite();
     }
     const BinaryStl stl = ReadBinary(path, true);
     EXPECT_EQ(stl.count, 2u);

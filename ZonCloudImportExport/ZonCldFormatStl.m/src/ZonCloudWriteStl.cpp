@@ -7,6 +7,14 @@
 
 ZonCloudWriteStl::ZonCloudWriteStl(const ZonUnicodeString& fileName) : ZonCloudWriteFile(fileName) {}
 
+ZonHResult ZonCloudWriteStl::BeginMultiWrite()
+{
+    if (!TryOpenStream("w+b")) return ZON_E_FAIL;
+    _headerPending = true;
+    _multiWrite = true;
+    return ZON_S_OK;
+}
+
 void ZonCloudWriteStl::BeginWriteTriangles(const unsigned& count)
 {
     if (!_file) {

@@ -12,6 +12,10 @@ class ZON_CLD_API ZonCloudWriteStl : public ZonCloudWriteFile, public ZonICloudW
 public:
     explicit ZonCloudWriteStl(const ZonUnicodeString& fileName);
 
+    // ZonICloudWriteFile: the file is opened for update, as the count is
+    // read back at each announcement.
+    ZonHResult BeginMultiWrite() override;
+
     // ZonICloudWritePolygonFile
     // Opens the file at the first announcement.
     void BeginWriteTriangles(const unsigned& count) override;
