@@ -124,18 +124,6 @@ TEST(Registry, FormatsSortedByNameWithDigitNamesLast)
     EXPECT_TRUE(std::all_of(firstDigit, all.end(), StartsWithDigit));
 }
 
-TEST(Registry, FiltersStayWithTheirNames)
-{
-    ZonListValZonUnicodeString names;
-    ZonListValZonString filters;
-    ZonCldImporter::GetAvailableFormats(names, filters, false);
-    for (std::size_t i = 0; i < names.size(); ++i) {
-        ZonString filter;
-        ZonCldImporter::GetFactory(names[i])->GetFileFilter(filter);
-        EXPECT_EQ(filters[i], filter) << names[i].ToUtf8();
-    }
-}
-
 TEST(Registry, LookupsByName)
 {
     EXPECT_TRUE(ZonCldImporter::IsFormatWithSampling("TestPoints"));
