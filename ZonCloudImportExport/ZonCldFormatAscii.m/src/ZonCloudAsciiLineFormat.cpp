@@ -32,39 +32,26 @@ NumberOutcome ScanNumber(const char*& p, const char* end, char decimalPoint, dou
     bool negative = false;
     if (s != end && (*s == '+' || *s == '-')) negative = *s++ == '-';
 
+    // Mantissa digits without leading zeros; beyond 19 of them the value is
+    // left to the full conversion (the sum may then overflow, unused).
     std::uint64_t mantissa = 0;
-    int significant = 0;
-    long exponent = 0;
-    bool anyDigit = false;
-    bool dropped = false;
-    for (; s != end && IsDigit(*s); ++s) {
-        anyDigit = true;
-        const int digit = *s - '0';
-        if (significant < 19) {
-            if (mantissa != 0 || digit != 0) {
-                mantissa = mantissa * 10 + static_cast<unsigned>(digit);
-                ++significant;
-            }
-        } else {
-            ++exponent;
-            dropped = dropped || digit != 0;
-        }
-    }
+    const char* integerStart = s;
+    while (s != end && *s == '0') ++s;
+    const char* significantStart = s;
+    while (s != end && IsDigit(*s)) mantissa = mantissa * 10 + static_cast<unsigned>(*s++ - '0');
+    std::ptrdiff_t significant = s - significantStart;
+    bool anyDigit = s != integerStart;
     if (s != end && (*s == 'x' || *s == 'X')) return NumberOutcome::Undecided;
+    long exponent = 0;
     if (s != end && *s == decimalPoint) {
-        for (++s; s != end && IsDigit(*s); ++s) {
-            anyDigit = true;
-            const int digit = *s - '0';
-            if (significant < 19) {
-                if (mantissa != 0 || digit != 0) {
-                    mantissa = mantissa * 10 + static_cast<unsigned>(digit);
-                    ++significant;
-                }
-                --exponent;
-            } else {
-                dropped = dropped || digit != 0;
-            }
-        }
+        const char* fractionStart = ++s;
+        if (significant == 0)
+            while (s != end && *s == '0') ++s;
+        const char* fractionSignificant = s;
+        while (s != end && IsDigit(*s)) mantissa = mantissa * 10 + static_cast<unsigned>(*s++ - '0');
+        significant += s - fractionSignificant;
+        exponent = -static_cast<long>(s - fractionStart);
+        anyDigit = anyDigit || s != fractionStart;
     }
     if (!anyDigit) {
         // Nothing numeric: "inf", "nan", a lone sign or point are the engine's.
@@ -84,7 +71,7 @@ NumberOutcome ScanNumber(const char*& p, const char* end, char decimalPoint, dou
         exponent += negativeExponent ? -written : written;
     }
 
-    if (!dropped && mantissa <= (std::uint64_t{1} << 53) && exponent >= -22 && exponent <= 22) {
+    if (significant <= 19 && mantissa <= (std::uint64_t{1} << 53) && exponent >= -22 && exponent <= 22) {
         // Both operands are exact doubles: one IEEE operation rounds correctly.
         double v = static_cast<double>(mantissa);
         if (mantissa != 0) v = exponent < 0 ? v / kExactPowers[-exponent] : v * kExactPowers[exponent];

@@ -42,6 +42,9 @@ public:
     bool NextScan() override;
     const float* GetScanPoints(unsigned& count) override;
     const double* GetScanPointsDouble(unsigned& count) override;
+    // The base's scan box queries (the scan interface forwards to them too).
+    using ZonCloudReadFile::GetScanPointsInBox;
+    using ZonCloudReadFile::GetScanPointsInBoxDouble;
 
     // ZonICloudReadOptDelimitor: line prefixes that begin and end a scan.
     void SetDelimiters(const ZonUnicodeString& begin, const ZonUnicodeString& end) override;

@@ -5,6 +5,8 @@
 #include <cstring>
 #include <new>
 
+#include <sys/stat.h>
+
 #include "ZonCloudOperErrorTool.h"
 #include "ZonCloudReadNLSTool.h"
 
@@ -22,13 +24,23 @@ void ZonCloudTextLineReader::Start(FILE* file, std::int64_t offset)
         ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Input, nullptr);
     }
     std::clearerr(_file);
-    if (_buffer.size() != _blockSize) {
-        try {
-            _buffer.assign(_blockSize, '\0');
-        } catch (const std::bad_alloc&) {
-            ZonCloudOperErrorTool::ThrowInsufficientMemory();
-        }
+    // A small file needs no large buffer; a big one is read a block at a time.
+    std::size_t wanted = _blockSize;
+    struct stat info {};
+    if (fstat(fileno(_file), &info) == 0 && S_ISREG(info.st_mode)) {
+        const std::int64_t remaining = std::max<std::int64_t>(static_cast<std::int64_t>(info.st_size) - offset, 0);
+        const auto minimum = static_cast<std::int64_t>(4 * (MaxPiece + 1));
+        wanted = static_cast<std::size_t>(
+            std::clamp<std::int64_t>(remaining + 1, minimum, static_cast<std::int64_t>(_blockSize)));
     }
+    if (_capacity < wanted) {
+        _buffer.reset();
+        _capacity = 0;
+        _buffer.reset(new (std::nothrow) char[wanted]);
+        if (!_buffer) ZonCloudOperErrorTool::ThrowInsufficientMemory();
+        _capacity = wanted;
+    }
+    _size = wanted;
     _begin = _end = 0;
     _bufferOffset = offset;
     _pieceOffset = offset;
@@ -37,8 +49,9 @@ void ZonCloudTextLineReader::Start(FILE* file, std::int64_t offset)
 
 void ZonCloudTextLineReader::Release()
 {
-    _buffer.clear();
-    _buffer.shrink_to_fit();
+    _buffer.reset();
+    _capacity = 0;
+    _size = 0;
     _begin = _end = 0;
     _file = nullptr;
 }
@@ -47,14 +60,14 @@ void ZonCloudTextLineReader::Refill()
 {
     // Keep the unread tail (shorter than one piece) and fill the rest.
     const std::size_t tail = _end - _begin;
-    if (tail > 0 && _begin > 0) std::memmove(_buffer.data(), _buffer.data() + _begin, tail);
+    if (tail > 0 && _begin > 0) std::memmove(_buffer.get(), _buffer.get() + _begin, tail);
     _bufferOffset += static_cast<std::int64_t>(_begin);
     _begin = 0;
     _end = tail;
-    while (_end < _buffer.size() && !_endOfFile) {
+    while (_end < _size && !_endOfFile) {
         errno = 0;
-        const std::size_t wanted = _buffer.size() - _end;
-        const std::size_t got = std::fread(_buffer.data() + _end, 1, wanted, _file);
+        const std::size_t wanted = _size - _end;
+        const std::size_t got = std::fread(_buffer.get() + _end, 1, wanted, _file);
         _end += got;
         // fread comes back short only at the end of the stream or on an error.
         if (got < wanted) {
@@ -73,7 +86,7 @@ bool ZonCloudTextLineReader::Next(const char*& first, const char*& last)
     if (_end - _begin <= MaxPiece && !_endOfFile) Refill();
     const std::size_t available = _end - _begin;
     if (available == 0) return false;
-    const char* start = _buffer.data() + _begin;
+    const char* start = _buffer.get() + _begin;
     const std::size_t window = std::min(available, MaxPiece);
     const void* newline = std::memchr(start, '\n', window);
     const std::size_t length =

@@ -2,7 +2,7 @@
 #include <cstddef>
 #include <cstdint>
 #include <cstdio>
-#include <vector>
+#include <memory>
 
 // Cuts an open stream into the pieces a 512-character fgets buffer would
 // receive: up to and including the next newline, at most 511 characters, so
@@ -37,7 +37,9 @@ private:
 
     FILE* _file = nullptr;
     std::size_t _blockSize;
-    std::vector<char> _buffer;
+    std::unique_ptr<char[]> _buffer;
+    std::size_t _capacity = 0;         // allocated bytes
+    std::size_t _size = 0;             // bytes used for this pass (small files need less)
     std::size_t _begin = 0;            // first unread byte in _buffer
     std::size_t _end = 0;              // end of the valid bytes in _buffer
     std::int64_t _bufferOffset = 0;    // file offset of _buffer[0]
