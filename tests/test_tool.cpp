@@ -121,6 +121,29 @@ TEST_F(Tool, ModuleErrorsExitWithOneAndAnswerJsonWhenAsked)
     EXPECT_EQ(o.Json()["error"]["key"], "ZonCloudReadNLSTool.ERR_FormatNotImplemented");
 }
 
+TEST_F(Tool, MeshesEndToEnd)
+{
+    const json formats = Run("formats --json").Json();
+    if (std::none_of(formats.begin(), formats.end(), [](const json& f) { return f["name"] == "STL"; }))
+        GTEST_SKIP() << "the STL reader is not in this build";
+    const std::string facet = "facet normal 0 0 1\nouter loop\nvertex 0 0 0\nvertex 1 0 0\nvertex 1 1 0\nendloop\nendfacet\n"
+                              "facet normal 0 0 1\nouter loop\nvertex 0 0 0\nvertex 1 1 0\nvertex 0 1 0\nendloop\nendfacet\n";
+    const std::string file = Quote(Write("square.stl", "solid s\n" + facet + "endsolid s\n"));
+    json d = Run("dump " + file + " --json").Json();
+    EXPECT_EQ(d["type"], 4);
+    ASSERT_EQ(d["polygons"].size(), 1u);
+    EXPECT_EQ(d["polygons"][0]["vertices"].size(), 4u);
+    EXPECT_EQ(d["polygons"][0]["triangles"], json::parse("[[0,1,2],[0,2,3]]"));
+    d = Run("dump " + file + " --box 0 0 0 1 0.5 1 --json").Json();  // the sub-mesh: two vertices, no triangle
+    EXPECT_EQ(d["polygons"][0]["vertices"].size(), 2u);
+    EXPECT_TRUE(d["polygons"][0]["triangles"].empty());
+
+    EXPECT_EQ(Run("info " + file + " --json").Json()["triangles"], 2);
+    const json i = Run("info " + file + " --no-triangles --json").Json();
+    EXPECT_EQ(i["triangles"], 0);
+    EXPECT_EQ(i["points"], 4);
+}
+
 // The free ASCII format, when this build has it.
 class ToolAscii : public Tool {
 protected:
