@@ -1,5 +1,6 @@
 #include "ZonCldPointArray.h"
 
+#include <algorithm>
 #include <cmath>
 #include <cstring>
 #include <type_traits>
@@ -26,6 +27,31 @@ void SelectTriples(std::vector<T>& values, const std::vector<std::size_t>& indic
     for (std::size_t i = 0; i < indices.size(); ++i)
         for (std::size_t k = 0; k < 3; ++k) kept[3 * i + k] = values[3 * indices[i] + k];
     values = std::move(kept);
+}
+// Accumulates in plain doubles: AddPoint per point is the slow path for millions of points.
+template <class T>
+void AddTriplesToBox(const std::vector<T>& xyz, const unsigned char* flags, ZonMathBox& box)
+{
+    double low[3] = {0, 0, 0}, high[3] = {0, 0, 0};
+    bool any = false;
+    for (std::size_t i = 0; i < xyz.size() / 3; ++i) {
+        if (flags && !flags[i]) continue;
+        const T* p = &xyz[3 * i];
+        // A point with a missing coordinate has no place in a box.
+        if (!std::isfinite(p[0]) || !std::isfinite(p[1]) || !std::isfinite(p[2])) continue;
+        if (!any) {
+            for (int a = 0; a < 3; ++a) low[a] = high[a] = p[a];
+            any = true;
+            continue;
+        }
+        for (int a = 0; a < 3; ++a) {
+            low[a] = std::min(low[a], static_cast<double>(p[a]));
+            high[a] = std::max(high[a], static_cast<double>(p[a]));
+        }
+    }
+    if (!any) return;
+    box.AddPoint(low[0], low[1], low[2]);
+    box.AddPoint(high[0], high[1], high[2]);
 }
 }  // namespace
 
@@ -59,23 +85,8 @@ ZonMathPoint ZonCldPointArray::GetPoint(std::size_t index) const
 
 void ZonCldPointArray::AddToBox(ZonMathBox& box, const unsigned char* flags) const
 {
-    const std::size_t n = GetNumberOfPoints();
-    if (n == 0) return;
-    // Accumulate in plain doubles: AddPoint per point is the slow path for millions of points.
-    double low[3], high[3];
-    bool any = false;
-    for (std::size_t i = 0; i < n; ++i) {
-        if (flags && !flags[i]) continue;
-        const ZonMathPoint p = GetPoint(i);
-        // A point with a missing coordinate has no place in a box.
-        if (!std::isfinite(p[0]) || !std::isfinite(p[1]) || !std::isfinite(p[2])) continue;
-        for (int a = 0; a < 3; ++a) {
-            if (!any || p[a] < low[a]) low[a] = p[a];
-            if (!any || p[a] > high[a]) high[a] = p[a];
-        }
-        any = true;
-    }
-    if (!any) return;
-    box.AddPoint(low[0], low[1], low[2]);
-    box.AddPoint(high[0], high[1], high[2]);
+    if (_double)
+        AddTriplesToBox(_doubles, flags, box);
+    else
+        AddTriplesToBox(_floats, flags, box);
 }
