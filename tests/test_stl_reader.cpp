@@ -272,6 +272,9 @@ TEST_F(StlReaderTest, TextForms)
     std::string garbage = "solid\n" + TextFacet("0 0 0", "1 0 0", "0 1 0");
     garbage += "vertex a b c\nvertex 1 2\nvertex -\n" + TextFacet("0 0 0", "2 0 0", "0 2 0");
 
+    // A line ends at a NUL, as a C string does: the vertex behind it is not read.
+    const std::string nul = "solid\n" + std::string("x\0vertex 9 9 9\n", 16) + TextFacet("0 0 0", "2 0 0", "0 2 0");
+
     const struct {
         const char* what;
         std::string text;
@@ -282,6 +285,7 @@ TEST_F(StlReaderTest, TextForms)
         {"decimal commas", commas, {0, 0, 0, 1.5f, 0, 0, 0, 1.25f, 0, 1.5f, 1.25f, 0}, {0, 1, 2, 1, 3, 2}},
         {"upper case", upper, {0, 0, 0, 2, 0, 0, 0, 2, 0}, {0, 1, 2}},
         {"3k+1 vertex lines", stray, {0, 0, 0, 1, 0, 0, 0, 1, 0, 1, 1, 0}, {0, 1, 2, 1, 3, 2}},
+        {"NUL in a line", nul, {0, 0, 0, 2, 0, 0, 0, 2, 0}, {0, 1, 2}},
         {"some garbage", garbage, {0, 0, 0, 1, 0, 0, 0, 1, 0, 2, 0, 0, 0, 2, 0}, {0, 1, 2, 0, 3, 4}},
     };
     for (const auto& c : cases) {

@@ -86,7 +86,8 @@ class LineSource {
 public:
     LineSource(FILE* file, std::size_t blockSize) : _file(file), _buffer(std::max(blockSize, 2 * kLineMax)) {}
 
-    // The next line, up to its first NUL (where a C string would end it).
+    // The next line. It may hold a NUL, where a C string would end it: the
+    // keyword search and the number scan stop there.
     bool Next(const char*& first, const char*& last)
     {
         if (_end - _pos < kLineMax && !_eof) Refill();
@@ -96,9 +97,8 @@ public:
         const void* newline = std::memchr(begin, '\n', available);
         const std::size_t length = newline ? static_cast<const char*>(newline) - begin + 1 : available;
         _pos += length;
-        const void* nul = std::memchr(begin, '\0', length);
         first = begin;
-        last = nul ? static_cast<const char*>(nul) : begin + length;
+        last = begin + length;
         return true;
     }
 
@@ -135,11 +135,14 @@ const char* Find(const char* first, const char* last, const char* word)
 }
 
 // Where the numbers of a vertex line start: just after its first "vertex",
-// else after its first "VERTEX"; null for any other line.
+// else after its first "VERTEX"; null for any other line. A keyword after a
+// NUL is not on the line.
 const char* AfterKeyword(const char* first, const char* last)
 {
-    if (const char* hit = Find(first, last, "vertex")) return hit + 6;
-    if (const char* hit = Find(first, last, "VERTEX")) return hit + 6;
+    for (const char* word : {"vertex", "VERTEX"}) {
+        const char* hit = Find(first, last, word);
+        if (hit && !std::memchr(first, '\0', static_cast<std::size_t>(hit - first))) return hit + 6;
+    }
     return nullptr;
 }
 
@@ -158,7 +161,8 @@ const char* ParseNumber(const char* first, const char* last, char point, double&
 // Three numbers as "%f%f%f" (or "%lf%lf%lf") read them. A number followed by
 // white space or the end of the line reads the same with the number parser,
 // which is the fast path; anything else ("1e+", "0x", "infinit", the other
-// decimal point) goes to the scan engine, which follows sscanf there too.
+// decimal point, a NUL) goes to the scan engine, which follows sscanf there
+// too and ends the input at a NUL.
 template <class T>
 bool ParseVertex(const char* first, const char* last, char point, T* xyz)
 {
