@@ -10,11 +10,16 @@ if [ -f "$sample" ]; then
   out="$build/demo"
   mkdir -p "$out"
   echo
-  echo "== zoncloud convert $sample $out/scans.asc --delimiters G08 G09"
-  "$build/zoncloud" convert "$sample" "$out/scans.asc" --delimiters G08 G09
+  echo "== zoncloud convert $sample $out/scans.asc --delimiters G08 G09 --double"
+  "$build/zoncloud" convert "$sample" "$out/scans.asc" --delimiters G08 G09 --double
   echo "-- first lines of $out/scans.asc:"
   head -n 14 "$out/scans.asc"
   echo "-- $(grep -c '^G08' "$out/scans.asc") scans, $(grep -c '^X ' "$out/scans.asc") points"
+  if diff -q <(grep -v '^!' "$out/scans.asc") <(tr -d '\r' < "$sample") >/dev/null; then
+    echo "-- scans and points identical to the sample's"
+  else
+    echo "-- the scans differ from the sample's"
+  fi
 else
   echo "no sample at $sample: nothing to convert" >&2
 fi
