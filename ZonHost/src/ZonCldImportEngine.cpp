@@ -7,10 +7,10 @@
 #include <type_traits>
 
 // The engine talks to readers through the module's public interfaces only.
-#include "../../ZonCloudImportExport/PublicInterfaces/ZonICloudReadFile.h"
-#include "../../ZonCloudImportExport/PublicInterfaces/ZonICloudReadGridFile.h"
-#include "../../ZonCloudImportExport/PublicInterfaces/ZonICloudReadPolygonFile.h"
-#include "../../ZonCloudImportExport/PublicInterfaces/ZonICloudReadScanFile.h"
+#include "ZonICloudReadFile.h"
+#include "ZonICloudReadGridFile.h"
+#include "ZonICloudReadPolygonFile.h"
+#include "ZonICloudReadScanFile.h"
 #include "ZonBaseUnknown.h"
 #include "ZonCloudOperErrorTool.h"
 #include "ZonMsgCatalog.h"
