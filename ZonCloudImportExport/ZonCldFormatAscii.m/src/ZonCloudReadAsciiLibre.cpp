@@ -48,6 +48,14 @@ void ReserveOrThrow(std::vector<T>& v, std::size_t n)
     }
 }
 
+// A first guess of the points a percent keeps; scans keep their first points on top.
+std::size_t FirstCapacity(std::size_t points, float step, bool scans)
+{
+    const auto guess = static_cast<std::size_t>(static_cast<double>(points) * step) + 1 +
+                       (scans && step != 1.0f ? 500 : 0);
+    return std::min(points, guess);
+}
+
 template <class T>
 void Free(std::vector<T>& v)
 {
@@ -410,9 +418,9 @@ bool ZonCloudReadAsciiLibre::SampleKeptPoints(std::vector<T>& store, const T*& d
 
     ZonCloudSampler sampler(_samplingPercent);
     sampler.Restart();
-    store.clear();
-    ReserveOrThrow(store, 3 * std::min<std::size_t>(n, sampler.CountKept(n) + 1));
     const bool scans = _digitizationType == DigitizationScans;
+    store.clear();
+    ReserveOrThrow(store, 3 * FirstCapacity(n, sampler.Step(), scans));
     std::size_t run = 0;
     for (std::size_t i = 0; i < n; ++i) {
         if (scans) {
@@ -441,11 +449,8 @@ void ZonCloudReadAsciiLibre::ReadPoints(std::vector<T>& store)
     const bool scans = _digitizationType == DigitizationScans;
     ZonCloudSampler sampler(_samplingPercent);
     sampler.Restart();
-    // A first guess from the percent; scans keep their first points on top.
-    std::size_t capacity = std::min<std::size_t>(n, static_cast<std::size_t>(n * sampler.Step()) + 1 +
-                                                        (scans && _samplingPercent != 100.0f ? 500 : 0));
     store.clear();
-    ReserveOrThrow(store, 3 * capacity);
+    ReserveOrThrow(store, 3 * FirstCapacity(n, sampler.Step(), scans));
 
     try {
         _lines.Start(_file, _dataStart);
