@@ -1,7 +1,5 @@
 #include "ZonCldSTLOutputDocument.h"
 
-#include <cerrno>
-
 #include "ZonCldSTLBinaryFormat.h"
 #include "ZonCloudPrintFormat.h"
 #include "ZonCloudReadNLSTool.h"

@@ -1,5 +1,4 @@
 #pragma once
-#include <cstdint>
 #include <cstdio>
 
 #include "ZonBaseUnknown.h"
@@ -41,14 +40,6 @@ protected:
     // fprintf to the stream with '.' as decimal point. Individual lines are
     // not checked: a full disk shows when the stream is closed.
     void Print(const char* format, ...) __attribute__((format(printf, 2, 3)));
-
-    // Binary output, every write checked (type 3 with the errno message).
-    void WriteBytes(const void* data, std::size_t size);
-    // 32-bit values in the writer's byte order (little-endian, or reversed).
-    void WriteUInt32(std::uint32_t value);
-    void WriteFloat32(float value);
-    std::uint32_t ReadUInt32();
-    void Seek(long offset, int whence);
 
     ZonUnicodeString _fileName;
     FILE* _file = nullptr;
