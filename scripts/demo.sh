@@ -7,6 +7,9 @@ build=${1:-build}
 # Convert the bundled scans into a free ASCII file, as a user would, and show it.
 sample=samples/scans.asc
 if [ -f "$sample" ]; then
+  echo
+  echo "== zoncloud info $sample --delimiters G08 G09"
+  "$build/zoncloud" info "$sample" --delimiters G08 G09
   out="$build/demo"
   mkdir -p "$out"
   echo
