@@ -5,6 +5,7 @@
 #include <cstdint>
 #include <cstdio>
 #include <cstdlib>
+#include <fstream>
 
 #include "ZonCloudReadStl.h"
 #include "ZonError.h"
@@ -14,15 +15,6 @@ namespace {
 // A plain array, still there when the exit handler removes the file.
 char gPath[64];
 
-const char* Path()
-{
-    if (!gPath[0]) {
-        std::snprintf(gPath, sizeof gPath, "/tmp/fuzz_stl_%d.stl", static_cast<int>(getpid()));
-        std::atexit([] { std::remove(gPath); });
-    }
-    return gPath;
-}
-
 void Check(bool condition)
 {
     if (!condition) std::abort();
@@ -30,18 +22,17 @@ void Check(bool condition)
 
 void ReadAll(bool doublePrecision)
 {
-    ZonCloudReadStl reader{ZonUnicodeString(Path())};
+    ZonCloudReadStl reader{ZonUnicodeString(gPath)};
     reader.SetDoublePrecision(doublePrecision);
     try {
         reader.BeginGetPolygon();
         Check(reader.NextPolygon());
-        unsigned nv = 0, nt = 0;
+        unsigned nv = 0, nt = 0, nd = 0;
         reader.GetPolygonPoints(nv);
         const unsigned* triangles = reader.GetTriangles(nt);
         Check(nt > 0 && nt == reader.GetNumberOfTriangles());
         for (unsigned i = 0; i < 3 * nt; ++i) Check(triangles[i] < nv);
         if (doublePrecision) {
-            unsigned nd = 0;
             reader.GetPointsDouble(nd);
             Check(nd == nv);
         }
@@ -49,15 +40,13 @@ void ReadAll(bool doublePrecision)
         ZonMathBox box;
         reader.GetBoundingBox(box);
         if (box.IsEmpty()) return;
-        const ZonMathPoint& low = box.GetLow();
-        const ZonMathPoint& high = box.GetHigh();
+        const ZonMathPoint &low = box.GetLow(), &high = box.GetHigh();
         const ZonMathBox half(low[0], (low[0] + high[0]) / 2, low[1], high[1], low[2], high[2]);
-        unsigned count = 0, inside = 0;
+        unsigned count = 0, inside = 0, walked = 0;
         const float* vertices = nullptr;
         const unsigned* kept = reader.GetTrianglesInBox(half, count, vertices, inside);
         Check(count <= nt && inside <= nv);
         for (unsigned i = 0; i < 3 * count; ++i) Check(kept[i] < inside);
-        unsigned walked = 0;
         while (reader.NextTriangleInBox()) ++walked;
         Check(walked == count);
     } catch (const ZonError& error) {
@@ -69,14 +58,13 @@ void ReadAll(bool doublePrecision)
 
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size)
 {
-    FILE* file = std::fopen(Path(), "wb");
-    if (!file) return 0;
-    if (size && std::fwrite(data, 1, size, file) != size) {
-        std::fclose(file);
-        return 0;
+    if (!gPath[0]) {
+        std::snprintf(gPath, sizeof gPath, "/tmp/fuzz_stl_%d.stl", static_cast<int>(getpid()));
+        std::atexit([] { std::remove(gPath); });
     }
-    std::fclose(file);
-    ReadAll(false);
-    ReadAll(true);
+    // The stream is closed at the end of the condition, before the file is read.
+    if (!std::ofstream(gPath, std::ios::binary).write(reinterpret_cast<const char*>(data), std::streamsize(size)))
+        return 0;
+    for (bool doublePrecision : {false, true}) ReadAll(doublePrecision);
     return 0;
 }

@@ -1,7 +1,7 @@
 // In-memory readers of every type of digitization, for the tests of the import
-// engine and the import entry. They check the protocol's order as file readers
-// do and sample each run with the shared rule.
+// engine and the import entry. They sample each run with the shared rule.
 #pragma once
+#include <algorithm>
 #include <cstdint>
 #include <string>
 #include <vector>
@@ -24,16 +24,16 @@ struct MemoryContent {
     };
 
     int type = 1;
-    std::vector<float> points;  // the cloud; for other types the structure's points are used
-    bool hasDouble = false;     // double queries answer, with doubleOffset added to tell them apart
+    std::vector<float> points{};  // the cloud; for other types the structure's points
+    bool hasDouble = false;       // double queries answer, with doubleOffset added to tell them apart
     double doubleOffset = 0.0;
-    std::vector<unsigned char> colors;
-    std::vector<std::int32_t> alphas, symbols;
-    std::vector<std::string> texts;
-    std::vector<std::vector<std::vector<float>>> sets;  // type 2: sets of scans of points
-    std::vector<std::vector<Row>> grids;                // type 3: grids of rows
-    std::vector<Mesh> meshes;                           // type 4
-    ZonICkeUnit_var unit;                               // the file's own unit, if any
+    std::vector<unsigned char> colors{};
+    std::vector<std::int32_t> alphas{}, symbols{};
+    std::vector<std::string> texts{};
+    std::vector<std::vector<std::vector<float>>> sets{};  // type 2: sets of scans of points
+    std::vector<std::vector<Row>> grids{};              // type 3: grids of rows
+    std::vector<Mesh> meshes{};                         // type 4
+    ZonICkeUnit_var unit{};                             // the file's own unit, if any
     bool openFile = false;                              // Analyse opens the file, as a file reader does
     bool failInPoints = false;                          // point queries raise "ERR_UnknownData"
 };
@@ -42,26 +42,29 @@ struct MemoryContent {
 class MemoryCloudReader : public ZonCloudReadFile {
 public:
     MemoryCloudReader(const ZonUnicodeString& fileName, MemoryContent content)
-        : ZonCloudReadFile(fileName), _content(std::move(content))
+        : ZonCloudReadFile(fileName), _content(std::move(content)), _all(_content.points)
     {
+        const auto add = [this](const std::vector<float>& p) { _all.insert(_all.end(), p.begin(), p.end()); };
+        for (const auto& set : _content.sets)
+            for (const auto& scan : set) add(scan);
+        for (const auto& grid : _content.grids)
+            for (const auto& row : grid) add(row.points);
+        for (const auto& mesh : _content.meshes) add(mesh.vertices);
     }
 
     const float* GetPoints(unsigned& count) override
     {
         Analyse();
-        return Sampled(AllPoints(), count);
+        return Sampled(_all, count);
     }
     const double* GetPointsDouble(unsigned& count) override
     {
-        if (!_content.hasDouble) return nullptr;
-        const float* points = GetPoints(count);
-        return Widened(points, count, _cloudDouble);
+        return _content.hasDouble ? Widened(GetPoints(count), count, _cloudDouble) : nullptr;
     }
     bool HasDoublePrecision() override { return _content.hasDouble; }
     const unsigned char* GetPointColors(unsigned& count) override
     {
-        count = static_cast<unsigned>(_content.colors.size() / 3);
-        return count ? _content.colors.data() : nullptr;
+        return static_cast<const unsigned char*>(Attribute(_content.colors, count, 3));
     }
     const void* GetPointAttributes1(unsigned& count) override { return Attribute(_content.alphas, count); }
     const void* GetPointAttributes2(unsigned& count) override { return Attribute(_content.symbols, count); }
@@ -74,9 +77,8 @@ protected:
         if (_analysed) return;
         if (_content.openFile) OpenFile();
         _digitizationType = _content.type;
-        const std::vector<float> all = AllPoints();
-        _numberOfPoints = static_cast<int>(all.size() / 3);
-        for (std::size_t i = 0; i < all.size(); i += 3) _boundingBox.AddPoint(all[i], all[i + 1], all[i + 2]);
+        _numberOfPoints = static_cast<int>(_all.size() / 3);
+        for (std::size_t i = 0; i < _all.size(); i += 3) _boundingBox.AddPoint(_all[i], _all[i + 1], _all[i + 2]);
         _analysed = true;
     }
 
@@ -92,7 +94,8 @@ protected:
         count = static_cast<unsigned>(_sampled.size() / 3);
         return count ? _sampled.data() : nullptr;
     }
-    const double* Widened(const float* points, unsigned count, std::vector<double>& buffer) const
+    // The count is read after the points were fetched, whatever the order of the arguments.
+    const double* Widened(const float* points, const unsigned& count, std::vector<double>& buffer) const
     {
         if (!points) return nullptr;
         buffer.assign(points, points + 3 * static_cast<std::size_t>(count));
@@ -100,32 +103,22 @@ protected:
         return buffer.data();
     }
 
-    std::vector<float> AllPoints() const
-    {
-        if (!_content.points.empty()) return _content.points;
-        std::vector<float> all;
-        const auto add = [&all](const std::vector<float>& p) { all.insert(all.end(), p.begin(), p.end()); };
-        for (const auto& set : _content.sets)
-            for (const auto& scan : set) add(scan);
-        for (const auto& grid : _content.grids)
-            for (const auto& row : grid) add(row.points);
-        for (const auto& mesh : _content.meshes) add(mesh.vertices);
-        return all;
-    }
-
+    // A per-point array of `per` values a point; null when empty.
     template <class T>
-    static const void* Attribute(const std::vector<T>& values, unsigned& count)
+    static const void* Attribute(const std::vector<T>& values, unsigned& count, std::size_t per = 1)
     {
-        count = static_cast<unsigned>(values.size());
+        count = static_cast<unsigned>(values.size() / per);
         return count ? values.data() : nullptr;
     }
 
     MemoryContent _content;
-    std::vector<float> _sampled;
+    std::vector<float> _all, _sampled;  // _all: every point, the cloud's answer whatever the type
     std::vector<double> _cloudDouble, _partDouble;
 };
 
 // A reader that offers the interface of every type; its content chooses the type.
+// Positions start before the first element, and reach only the content through
+// at(): a call out of the protocol's order throws.
 class MemoryReader : public MemoryCloudReader,
                      public ZonTieCloudReadScanFile<MemoryReader>,
                      public ZonTieCloudReadGridFile<MemoryReader>,
@@ -134,70 +127,31 @@ class MemoryReader : public MemoryCloudReader,
 public:
     using MemoryCloudReader::MemoryCloudReader;
 
-    // Scans.
-    void BeginGetSetOfScans() override { _set = Begin(DigitizationScans, "ERR_NotAScanDigit"); }
-    bool NextSetOfScans() override
-    {
-        if (_set == NotBegun) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_BeginGetSetOfScansNotDone");
-        _scan = NotBegun;
-        return ++_set < static_cast<int>(_content.sets.size());
-    }
-    void BeginGetScan() override
-    {
-        if (_set < 0 || _set >= static_cast<int>(_content.sets.size()))
-            ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Usage, "ERR_NextSetOfScansNotDone");
-        _scan = -1;
-    }
-    bool NextScan() override
-    {
-        if (_scan == NotBegun) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Usage, "ERR_BeginGetScanNotDone");
-        return ++_scan < static_cast<int>(_content.sets[_set].size());
-    }
-    const float* GetScanPoints(unsigned& count) override { return Sampled(_content.sets[_set][_scan], count); }
+    void BeginGetSetOfScans() override { _set = -1; }
+    bool NextSetOfScans() override { return ++_set < Size(_content.sets); }
+    void BeginGetScan() override { _scan = -1; }
+    bool NextScan() override { return ++_scan < Size(_content.sets.at(_set)); }
+    const float* GetScanPoints(unsigned& count) override { return Sampled(_content.sets.at(_set).at(_scan), count); }
     const double* GetScanPointsDouble(unsigned& count) override
     {
-        const float* points = GetScanPoints(count);
-        return Widened(points, count, _partDouble);
+        return Widened(GetScanPoints(count), count, _partDouble);
     }
 
     // Grids: one row per call, then null.
-    void BeginGetGrid() override { _grid = Begin(DigitizationGrids, "ERR_NotAGridDigit"); }
-    bool NextGrid() override
-    {
-        if (_grid == NotBegun) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Usage, "ERR_BeginGetGridNotDone");
-        _row = NotBegun;
-        return ++_grid < static_cast<int>(_content.grids.size());
-    }
-    void BeginGetGridPoints() override
-    {
-        if (_grid < 0 || _grid >= static_cast<int>(_content.grids.size()))
-            ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Usage, "ERR_NextGridNotDone");
-        _row = 0;
-    }
+    void BeginGetGrid() override { _grid = -1; }
+    bool NextGrid() override { return ++_grid < Size(_content.grids); }
+    void BeginGetGridPoints() override { _row = 0; }
     const float* GetGridPoints(unsigned& count, const unsigned char*& valid) override
     {
-        count = 0;
-        valid = nullptr;
-        if (_row == NotBegun) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Usage, "ERR_NextGridNotDone");
-        if (_row >= static_cast<int>(_content.grids[_grid].size())) return nullptr;
-        const MemoryContent::Row& row = _content.grids[_grid][_row++];
-        count = static_cast<unsigned>(row.points.size() / 3);
-        valid = row.valid.empty() ? nullptr : row.valid.data();
-        return row.points.data();
-    }
-    const double* GetGridPointsDouble(unsigned& count, const unsigned char*& valid) override
-    {
-        const float* points = GetGridPoints(count, valid);
-        return Widened(points, count, _partDouble);
+        const auto& rows = _content.grids.at(_grid);
+        const MemoryContent::Row* row = _row < Size(rows) ? &rows.at(_row++) : nullptr;
+        count = row ? static_cast<unsigned>(row->points.size() / 3) : 0;
+        valid = row && !row->valid.empty() ? row->valid.data() : nullptr;
+        return row ? row->points.data() : nullptr;
     }
 
-    // Polygons.
-    void BeginGetPolygon() override { _polygon = Begin(DigitizationPolygons, "ERR_NotAPolygonDigit"); }
-    bool NextPolygon() override
-    {
-        if (_polygon == NotBegun) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Usage, "ERR_BeginGetPolygonNotDone");
-        return ++_polygon < static_cast<int>(_content.meshes.size());
-    }
+    void BeginGetPolygon() override { _polygon = -1; }
+    bool NextPolygon() override { return ++_polygon < Size(_content.meshes); }
     bool IsClosedPolygon() override { return false; }
     bool IsOrientedPolygon() override { return false; }
     const float* GetPolygonPoints(unsigned& count) override
@@ -219,43 +173,34 @@ public:
         ZonMathBox fileBox;
         GetBoundingBox(fileBox);
         const std::vector<float>& all = Mesh().vertices;
-        std::vector<long> number(all.size() / 3, -1);
+        std::vector<unsigned> number(all.size() / 3, ~0u);  // ~0u: outside the box
         _boxVertices.clear();
         _boxTriangles.clear();
-        for (std::size_t i = 0; i < number.size(); ++i) {
-            if (!IsInQueryBox(all[3 * i], all[3 * i + 1], all[3 * i + 2], box, fileBox)) continue;
-            number[i] = static_cast<long>(_boxVertices.size() / 3);
-            _boxVertices.insert(_boxVertices.end(), &all[3 * i], &all[3 * i] + 3);
-        }
-        const std::vector<unsigned>& triangles = Mesh().triangles;
-        for (std::size_t t = 0; t < triangles.size(); t += 3) {
-            const unsigned* v = &triangles[t];
-            if (number.at(v[0]) >= 0 && number.at(v[1]) >= 0 && number.at(v[2]) >= 0)
-                for (int k = 0; k < 3; ++k) _boxTriangles.push_back(static_cast<unsigned>(number[v[k]]));
-        }
+        for (std::size_t i = 0; i < all.size(); i += 3)
+            if (IsInQueryBox(all[i], all[i + 1], all[i + 2], box, fileBox)) {
+                number[i / 3] = static_cast<unsigned>(_boxVertices.size() / 3);
+                _boxVertices.insert(_boxVertices.end(), &all[i], &all[i] + 3);
+            }
+        const std::vector<unsigned>& t = Mesh().triangles;
+        for (std::size_t i = 0; i + 2 < t.size(); i += 3)
+            if (std::max({number.at(t[i]), number.at(t[i + 1]), number.at(t[i + 2])}) != ~0u)
+                _boxTriangles.insert(_boxTriangles.end(), {number[t[i]], number[t[i + 1]], number[t[i + 2]]});
         vertices = _boxVertices.data();
         vertexCount = static_cast<unsigned>(_boxVertices.size() / 3);
         count = static_cast<unsigned>(_boxTriangles.size() / 3);
         return _boxTriangles.data();
     }
 
-    // The triangles option, stored for the importer.
     void SetTriangles(bool create) override { _createTriangles = create; }
     void GetTriangles(bool& create) override { create = _createTriangles; }
 
 private:
-    static constexpr int NotBegun = -2;
-
-    // The checks of a Begin operation; the position before the first element.
-    int Begin(int type, const char* code)
-    {
-        if (!IsTypeOfDigitization(type)) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Usage, code);
-        return -1;
-    }
-    const MemoryContent::Mesh& Mesh() const { return _content.meshes.at(static_cast<std::size_t>(_polygon)); }
+    template <class C>
+    static int Size(const C& c) { return static_cast<int>(c.size()); }
+    const MemoryContent::Mesh& Mesh() const { return _content.meshes.at(_polygon); }
 
     bool _createTriangles = true;
-    int _set = NotBegun, _scan = NotBegun, _grid = NotBegun, _row = NotBegun, _polygon = NotBegun;
+    int _set = -2, _scan = -2, _grid = -2, _row = -2, _polygon = -2;  // -2: no Begin yet
     std::vector<float> _boxVertices;
     std::vector<unsigned> _boxTriangles;
 };

@@ -4,9 +4,13 @@
 
 #include "MemoryReaders.h"
 #include "ZonCldImportEngine.h"
-#include "ZonError.h"
+#include "ZonTestFiles.h"
 
 namespace {
+
+using Floats = std::vector<float>;
+using Ints = std::vector<std::int32_t>;
+using Valid = std::vector<unsigned char>;
 
 struct Import {
     ZonCldBody_var body;
@@ -17,24 +21,23 @@ struct Import {
 struct Settings {
     bool doublePrecision = false;
     ZonICkeUnit_var unit = ZonICkeUnit::FromName("mm");
-    ZonMathBox box;
+    ZonMathBox box{};
     double scale = 1.0;
-    bool triangles = true;
 };
 
-Import Walk(const std::shared_ptr<ZonICloudReadFile>& reader, const Settings& s = {})
+template <class Reader = MemoryReader>
+Import Walk(const MemoryContent& content, const Settings& s = {})
 {
     ZonGeoFactoryProtected factory;
-    Import result;
-    result.body = factory.CreateCldBody();
-    ZonCldImportEngine::InsertFile(*result.body, factory, reader, s.doublePrecision, s.unit, s.box, s.scale,
-                                   result.messages, result.statistics, s.triangles);
-    return result;
+    Import r{factory.CreateCldBody(), {}, {}};
+    ZonCldImportEngine::InsertFile(*r.body, factory, std::make_shared<Reader>("f", content), s.doublePrecision, s.unit,
+                                   s.box, s.scale, r.messages, r.statistics, true);
+    return r;
 }
 
-std::vector<float> Floats(const ZonCldPointArray& points)
+Floats FloatsOf(const ZonCldPointArray& points)
 {
-    std::vector<float> v;
+    Floats v;
     for (std::size_t i = 0; i < points.GetNumberOfPoints(); ++i) {
         const ZonMathPoint p = points.GetPoint(i);
         v.insert(v.end(), {float(p[0]), float(p[1]), float(p[2])});
@@ -42,93 +45,88 @@ std::vector<float> Floats(const ZonCldPointArray& points)
     return v;
 }
 
-// Points (i, 2i, 3i) for i = 0 .. n-1.
-std::vector<float> Line(int n, float start = 0)
+std::vector<std::string> TextsOf(const ZonCldCloud& cloud)
 {
-    std::vector<float> v;
+    std::vector<std::string> texts;
+    for (const auto& text : cloud.Texts()) texts.push_back(text.ToUtf8());
+    return texts;
+}
+
+// Points (i, 2i, 3i) for i = start .. start + n - 1.
+Floats Line(int n, float start = 0)
+{
+    Floats v;
     for (int i = 0; i < n; ++i) v.insert(v.end(), {start + i, 2 * (start + i), 3 * (start + i)});
     return v;
 }
 
 MemoryContent CloudContent()
 {
-    MemoryContent c;
-    c.points = Line(4);
-    c.colors = {10, 11, 12, 20, 21, 22, 30, 31, 32, 40, 41, 42};
-    c.alphas = {1, 2, 3, 4};
-    c.symbols = {5, 6, 7, 8};
-    c.texts = {"a", "b", "c", "d"};
-    return c;
+    return {.points = Line(4), .colors = {10, 11, 12, 20, 21, 22, 30, 31, 32, 40, 41, 42}, .alphas = {1, 2, 3, 4},
+            .symbols = {5, 6, 7, 8}, .texts = {"a", "b", "c", "d"}};
+}
+// The second scan of the first set is empty.
+MemoryContent ScanContent() { return {.type = 2, .sets = {{Line(3), {}, Line(2, 10)}, {Line(4, 20)}}}; }
+// Grid 1: two rows of three, a hole in the second row. Grid 2: one row, no validity array.
+MemoryContent GridContent()
+{
+    return {.type = 3, .grids = {{{Line(3), {}}, {Line(3, 5), {1, 0, 1}}}, {{Line(2, 30), {}}}}};
+}
+// A unit square in z = 0 made of two triangles, and a lone triangle at x = 5..6.
+MemoryContent MeshContent()
+{
+    return {.type = 4,
+            .meshes = {{{0, 0, 0, 1, 0, 0, 1, 1, 0, 0, 1, 0}, {0, 1, 2, 0, 2, 3}},
+                       {{5, 0, 0, 6, 0, 0, 6, 1, 0}, {0, 1, 2}}}};
 }
 
-TEST(ImportEngine, CloudKeepsPointsColoursAndAttributes)
+TEST(ImportEngine, CloudKeepsItsPerPointArraysAndTheBoxNarrowsThem)
 {
-    const Import r = Walk(std::make_shared<MemoryReader>("f", CloudContent()));
+    Import r = Walk(CloudContent());
     ASSERT_EQ(r.body->GetClouds().size(), 1u);
-    const ZonCldCloud& cloud = *r.body->GetClouds()[0];
-    EXPECT_EQ(Floats(cloud.Points()), Line(4));
-    EXPECT_FALSE(cloud.Points().IsDoublePrecision());
-    EXPECT_EQ(cloud.Colors(), CloudContent().colors);
-    EXPECT_EQ(cloud.Alphas(), (std::vector<std::int32_t>{1, 2, 3, 4}));
-    EXPECT_EQ(cloud.Symbols(), (std::vector<std::int32_t>{5, 6, 7, 8}));
-    ASSERT_EQ(cloud.Texts().size(), 4u);
-    EXPECT_EQ(cloud.Texts()[3].ToUtf8(), "d");
+    const ZonCldCloud* cloud = r.body->GetClouds()[0].get();
     EXPECT_EQ(r.body->GetTypeOfDigitization(), 1);
-    EXPECT_TRUE(r.body->GetSetsOfScans().empty());
-}
+    EXPECT_EQ(FloatsOf(cloud->Points()), Line(4));
+    EXPECT_EQ(cloud->Colors(), CloudContent().colors);
+    EXPECT_EQ(cloud->Alphas(), (Ints{1, 2, 3, 4}));
+    EXPECT_EQ(cloud->Symbols(), (Ints{5, 6, 7, 8}));
+    EXPECT_EQ(TextsOf(*cloud), CloudContent().texts);
 
-TEST(ImportEngine, BoxClipsWithTheReadersQueryAndNarrowsPerPointArrays)
-{
-    Settings s;
-    s.box = ZonMathBox(1, 2.5, 0, 10, 0, 10);  // x in [1, 2.5): points 1 and 2
-    const Import r = Walk(std::make_shared<MemoryReader>("f", CloudContent()), s);
+    r = Walk(CloudContent(), {.box = ZonMathBox(1, 2.5, 0, 10, 0, 10)});  // x in [1, 2.5): points 1 and 2
     ASSERT_EQ(r.body->GetClouds().size(), 1u);
-    const ZonCldCloud& cloud = *r.body->GetClouds()[0];
-    EXPECT_EQ(Floats(cloud.Points()), Line(2, 1));
-    EXPECT_EQ(cloud.Colors(), (std::vector<unsigned char>{20, 21, 22, 30, 31, 32}));
-    EXPECT_EQ(cloud.Alphas(), (std::vector<std::int32_t>{2, 3}));
-    ASSERT_EQ(cloud.Texts().size(), 2u);
-    EXPECT_EQ(cloud.Texts()[0].ToUtf8(), "b");
-}
+    cloud = r.body->GetClouds()[0].get();
+    EXPECT_EQ(FloatsOf(cloud->Points()), Line(2, 1));
+    EXPECT_EQ(cloud->Colors(), (Valid{20, 21, 22, 30, 31, 32}));
+    EXPECT_EQ(cloud->Alphas(), (Ints{2, 3}));
+    EXPECT_EQ(TextsOf(*cloud), (std::vector<std::string>{"b", "c"}));
 
-TEST(ImportEngine, PerPointArraysOfAnotherLengthAreLeftOut)
-{
-    MemoryContent c = CloudContent();
-    c.colors.resize(9);  // three colours for four points
-    c.texts.pop_back();
-    const Import r = Walk(std::make_shared<MemoryReader>("f", c));
-    const ZonCldCloud& cloud = *r.body->GetClouds()[0];
-    EXPECT_TRUE(cloud.Colors().empty());
-    EXPECT_TRUE(cloud.Texts().empty());
-    EXPECT_EQ(cloud.Alphas().size(), 4u);
+    MemoryContent odd = CloudContent();  // arrays of another length than the points are left out
+    odd.colors.resize(9);
+    odd.texts.pop_back();
+    r = Walk(odd);
+    cloud = r.body->GetClouds()[0].get();
+    EXPECT_TRUE(cloud->Colors().empty());
+    EXPECT_TRUE(cloud->Texts().empty());
+    EXPECT_EQ(cloud->Alphas().size(), 4u);
 }
 
 TEST(ImportEngine, ScaleAndUnitConvertToMillimetres)
 {
-    struct Case {
+    const struct {
         const char* settingUnit;
         const char* fileUnit;  // the reader's own, or null
-        double scale;
-        double factor;
+        double scale, factor;
         const char* unitName;
+    } cases[] = {
+        {"mm", nullptr, 1.0, 1.0, "mm"},   {"Inch", nullptr, 1.0, 25.4, "Inch"}, {"mm", nullptr, 0.5, 0.5, "mm"},
+        {"m", nullptr, 2.0, 2000.0, "m"},  // a file that carries its unit wins over the setting:
+        {"mm", "Inch", 1.0, 25.4, "Inch"}, {"m", "mm", 3.0, 3.0, "mm"},
     };
-    const Case cases[] = {
-        {"mm", nullptr, 1.0, 1.0, "mm"},
-        {"Inch", nullptr, 1.0, 25.4, "Inch"},
-        {"mm", nullptr, 0.5, 0.5, "mm"},
-        {"m", nullptr, 2.0, 2000.0, "m"},
-        {"mm", "Inch", 1.0, 25.4, "Inch"},  // a file that carries its unit wins over the setting
-        {"m", "mm", 3.0, 3.0, "mm"},
-    };
-    for (const Case& c : cases) {
+    for (const auto& c : cases) {
         SCOPED_TRACE(std::string(c.settingUnit) + " " + (c.fileUnit ? c.fileUnit : "-"));
-        MemoryContent content;
-        content.points = {1, 2, 3, -4, 0.5f, 8};
-        if (c.fileUnit) content.unit = ZonICkeUnit::FromName(c.fileUnit);
-        Settings s;
-        s.unit = ZonICkeUnit::FromName(c.settingUnit);
-        s.scale = c.scale;
-        const Import r = Walk(std::make_shared<MemoryReader>("f", content), s);
+        const MemoryContent content{.points = {1, 2, 3, -4, 0.5f, 8},
+                                    .unit = c.fileUnit ? ZonICkeUnit::FromName(c.fileUnit) : nullptr};
+        const Import r = Walk(content, {.unit = ZonICkeUnit::FromName(c.settingUnit), .scale = c.scale});
         const ZonCldPointArray& points = r.body->GetClouds()[0]->Points();
         EXPECT_FLOAT_EQ(points.GetPoint(1)[0], float(-4 * c.factor));
         EXPECT_FLOAT_EQ(points.GetPoint(1)[1], float(0.5 * c.factor));
@@ -139,153 +137,89 @@ TEST(ImportEngine, ScaleAndUnitConvertToMillimetres)
 
 TEST(ImportEngine, DoublePrecisionOnlyWhenAskedAndOffered)
 {
-    MemoryContent content;
-    content.points = {1, 2, 3};
-    content.hasDouble = true;
-    content.doubleOffset = 0.25;  // the double array differs from the float one
-    Settings s;
-    s.doublePrecision = true;
-    Import r = Walk(std::make_shared<MemoryReader>("f", content), s);
-    const ZonCldPointArray& doubles = r.body->GetClouds()[0]->Points();
-    EXPECT_TRUE(doubles.IsDoublePrecision());
-    EXPECT_EQ(doubles.GetPoint(0)[0], 1.25);
-
-    s.doublePrecision = false;
-    r = Walk(std::make_shared<MemoryReader>("f", content), s);
-    EXPECT_FALSE(r.body->GetClouds()[0]->Points().IsDoublePrecision());
-    EXPECT_EQ(r.body->GetClouds()[0]->Points().GetPoint(0)[0], 1.0);
-
-    content.hasDouble = false;  // asked for, but the reader has single precision only
-    s.doublePrecision = true;
-    r = Walk(std::make_shared<MemoryReader>("f", content), s);
-    EXPECT_FALSE(r.body->GetClouds()[0]->Points().IsDoublePrecision());
-    EXPECT_EQ(r.body->GetNumberOfPoints(), 1u);
-}
-
-MemoryContent ScanContent()
-{
-    MemoryContent c;
-    c.type = 2;
-    c.sets = {{Line(3), {}, Line(2, 10)}, {Line(4, 20)}};  // the second scan of the first set is empty
-    return c;
+    const struct {
+        bool offered, asked;
+        double x;  // the first coordinate: the double array has 0.25 added
+    } cases[] = {{true, true, 1.25}, {true, false, 1.0}, {false, true, 1.0}};
+    for (const auto& c : cases) {
+        const Import r = Walk({.points = {1, 2, 3}, .hasDouble = c.offered, .doubleOffset = 0.25},
+                              {.doublePrecision = c.asked});
+        const ZonCldPointArray& points = r.body->GetClouds()[0]->Points();
+        EXPECT_EQ(points.IsDoublePrecision(), c.offered && c.asked);
+        EXPECT_EQ(points.GetPoint(0)[0], c.x);
+        EXPECT_EQ(points.GetNumberOfPoints(), 1u);
+    }
 }
 
 TEST(ImportEngine, ScansAreWalkedSetBySetAndEmptyScansLeftOut)
 {
-    const Import r = Walk(std::make_shared<MemoryReader>("f", ScanContent()));
+    Import r = Walk(ScanContent());
     ASSERT_EQ(r.body->GetSetsOfScans().size(), 2u);
-    const auto& first = r.body->GetSetsOfScans()[0]->GetScans();
-    ASSERT_EQ(first.size(), 2u);
-    EXPECT_EQ(Floats(first[0]->Points()), Line(3));
-    EXPECT_EQ(Floats(first[1]->Points()), Line(2, 10));
-    EXPECT_EQ(Floats(r.body->GetSetsOfScans()[1]->GetScans()[0]->Points()), Line(4, 20));
+    ASSERT_EQ(r.body->GetSetsOfScans()[0]->GetNumberOfScans(), 2u);
+    EXPECT_EQ(FloatsOf(r.body->GetSetsOfScans()[0]->GetScans()[0]->Points()), Line(3));
+    EXPECT_EQ(FloatsOf(r.body->GetSetsOfScans()[0]->GetScans()[1]->Points()), Line(2, 10));
+    EXPECT_EQ(FloatsOf(r.body->GetSetsOfScans()[1]->GetScans()[0]->Points()), Line(4, 20));
     EXPECT_TRUE(r.body->GetClouds().empty());
     EXPECT_EQ(r.body->GetNumberOfPoints(), 9u);
-}
 
-TEST(ImportEngine, ScanBoxDropsScansWithNothingInside)
-{
-    Settings s;
-    s.box = ZonMathBox(9, 21.5, -100, 100, -100, 100);
-    s.doublePrecision = true;  // the reader has no double precision: single is used
-    Import r = Walk(std::make_shared<MemoryReader>("f", ScanContent()), s);
+    // The box leaves out the scans with nothing inside. Double precision is
+    // asked for: single from a reader without it, double from one with it.
+    const Settings s{.doublePrecision = true, .box = ZonMathBox(9, 21.5, -100, 100, -100, 100)};
+    r = Walk(ScanContent(), s);
     ASSERT_EQ(r.body->GetSetsOfScans().size(), 2u);
     ASSERT_EQ(r.body->GetSetsOfScans()[0]->GetNumberOfScans(), 1u);
-    EXPECT_EQ(Floats(r.body->GetSetsOfScans()[0]->GetScans()[0]->Points()), Line(2, 10));
-    EXPECT_EQ(Floats(r.body->GetSetsOfScans()[1]->GetScans()[0]->Points()), Line(2, 20));
-
-    MemoryContent c = ScanContent();
-    c.hasDouble = true;
-    c.doubleOffset = 0.25;  // now it has: the double scans are taken
-    r = Walk(std::make_shared<MemoryReader>("f", c), s);
+    EXPECT_EQ(FloatsOf(r.body->GetSetsOfScans()[0]->GetScans()[0]->Points()), Line(2, 10));
+    EXPECT_EQ(FloatsOf(r.body->GetSetsOfScans()[1]->GetScans()[0]->Points()), Line(2, 20));
+    r = Walk({.type = 2, .hasDouble = true, .doubleOffset = 0.25, .sets = ScanContent().sets}, s);
     const ZonCldPointArray& points = r.body->GetSetsOfScans()[1]->GetScans()[0]->Points();
     EXPECT_TRUE(points.IsDoublePrecision());
     EXPECT_EQ(points.GetPoint(0)[0], 20.25);
     EXPECT_EQ(points.GetNumberOfPoints(), 2u);
 }
 
-MemoryContent GridContent()
+TEST(ImportEngine, GridsKeepRowsAndHolesAndTheBoxMakesHoles)
 {
-    MemoryContent c;
-    c.type = 3;
-    // Grid 1: two rows of three, a hole in the second row. Grid 2: one row, no validity array.
-    c.grids = {{{Line(3), {}}, {Line(3, 5), {1, 0, 1}}}, {{Line(2, 30), {}}}};
-    return c;
-}
-
-TEST(ImportEngine, GridsKeepRowsAndHoles)
-{
-    const Import r = Walk(std::make_shared<MemoryReader>("f", GridContent()));
+    Import r = Walk(GridContent());
     ASSERT_EQ(r.body->GetSetsOfGrids().size(), 1u);
-    const auto& grids = r.body->GetSetsOfGrids()[0]->GetGrids();
-    ASSERT_EQ(grids.size(), 2u);
-    ASSERT_EQ(grids[0]->GetNumberOfRows(), 2u);
-    EXPECT_EQ(grids[0]->GetRows()[0].valid, (std::vector<unsigned char>{1, 1, 1}));
-    EXPECT_EQ(grids[0]->GetRows()[1].valid, (std::vector<unsigned char>{1, 0, 1}));
-    EXPECT_EQ(Floats(grids[0]->GetRows()[1].points), Line(3, 5));
-    EXPECT_EQ(grids[1]->GetNumberOfRows(), 1u);
+    const auto* grids = &r.body->GetSetsOfGrids()[0]->GetGrids();
+    ASSERT_EQ(grids->size(), 2u);
+    ASSERT_EQ((*grids)[0]->GetNumberOfRows(), 2u);
+    EXPECT_EQ((*grids)[0]->GetRows()[0].valid, (Valid{1, 1, 1}));
+    EXPECT_EQ((*grids)[0]->GetRows()[1].valid, (Valid{1, 0, 1}));
+    EXPECT_EQ(FloatsOf((*grids)[0]->GetRows()[1].points), Line(3, 5));
+    EXPECT_EQ((*grids)[1]->GetNumberOfRows(), 1u);
     EXPECT_EQ(r.body->GetNumberOfPoints(), 7u);  // holes are not points
     EXPECT_EQ(r.body->GetNumberOfGrids(), 2u);
-}
 
-TEST(ImportEngine, GridBoxTurnsOutsidePointsIntoHoles)
-{
-    Settings s;
-    s.box = ZonMathBox(1, 6.5, -100, 100, -100, 100);
-    const Import r = Walk(std::make_shared<MemoryReader>("f", GridContent()), s);
-    const auto& grids = r.body->GetSetsOfGrids()[0]->GetGrids();
-    EXPECT_EQ(grids[0]->GetRows()[0].valid, (std::vector<unsigned char>{0, 1, 1}));
-    EXPECT_EQ(grids[0]->GetRows()[1].valid, (std::vector<unsigned char>{1, 0, 0}));
-    EXPECT_EQ(grids[0]->GetRows()[1].points.GetNumberOfPoints(), 3u);  // rows keep their length
-    EXPECT_EQ(grids[1]->GetRows()[0].valid, (std::vector<unsigned char>{0, 0}));
+    r = Walk(GridContent(), {.box = ZonMathBox(1, 6.5, -100, 100, -100, 100)});
+    grids = &r.body->GetSetsOfGrids()[0]->GetGrids();
+    EXPECT_EQ((*grids)[0]->GetRows()[0].valid, (Valid{0, 1, 1}));
+    EXPECT_EQ((*grids)[0]->GetRows()[1].valid, (Valid{1, 0, 0}));
+    EXPECT_EQ((*grids)[0]->GetRows()[1].points.GetNumberOfPoints(), 3u);  // rows keep their length
+    EXPECT_EQ((*grids)[1]->GetRows()[0].valid, (Valid{0, 0}));
     EXPECT_EQ(r.body->GetNumberOfPoints(), 3u);
 }
 
-MemoryContent MeshContent()
+TEST(ImportEngine, PolygonsTheirTrianglesAndTheReadersSubMesh)
 {
-    MemoryContent c;
-    c.type = 4;
-    // A unit square in z = 0 made of two triangles, and a lone triangle at x = 5..6.
-    c.meshes = {{{0, 0, 0, 1, 0, 0, 1, 1, 0, 0, 1, 0}, {0, 1, 2, 0, 2, 3}}, {{5, 0, 0, 6, 0, 0, 6, 1, 0}, {0, 1, 2}}};
-    return c;
-}
-
-TEST(ImportEngine, PolygonsWithAndWithoutTriangles)
-{
-    const auto reader = std::make_shared<MemoryReader>("f", MeshContent());
-    Import r = Walk(reader);
+    Import r = Walk(MeshContent());
     ASSERT_EQ(r.body->GetPolygons().size(), 2u);
     EXPECT_EQ(r.body->GetPolygons()[0]->Triangles(), (std::vector<unsigned>{0, 1, 2, 0, 2, 3}));
     EXPECT_EQ(r.body->GetPolygons()[1]->GetNumberOfVertices(), 3u);
     EXPECT_EQ(r.body->GetNumberOfTriangles(), 3u);
 
-    Settings s;
-    s.triangles = false;
-    r = Walk(std::make_shared<MemoryReader>("f", MeshContent()), s);
-    EXPECT_EQ(r.body->GetNumberOfTriangles(), 0u);
-    EXPECT_EQ(r.body->GetNumberOfPoints(), 7u);
-}
-
-TEST(ImportEngine, PolygonBoxUsesTheReadersSubMesh)
-{
-    Settings s;
-    s.box = ZonMathBox(-1, 1, -1, 2, -1, 1);  // x < 1: vertices 0 and 3 of the square only
-    Import r = Walk(std::make_shared<MemoryReader>("f", MeshContent()), s);
-    ASSERT_EQ(r.body->GetPolygons().size(), 1u);  // the lone triangle has nothing inside
+    r = Walk(MeshContent(), {.box = ZonMathBox(-1, 1, -1, 2, -1, 1)});  // x < 1: vertices 0 and 3 of the square only
+    ASSERT_EQ(r.body->GetPolygons().size(), 1u);                         // the lone triangle has nothing inside
     EXPECT_EQ(r.body->GetPolygons()[0]->GetNumberOfVertices(), 2u);
     EXPECT_EQ(r.body->GetNumberOfTriangles(), 0u);
-
-    s.box = ZonMathBox(-1, 6, -1, 1, -1, 1);  // x and y upper faces closed on the file's highs
-    r = Walk(std::make_shared<MemoryReader>("f", MeshContent()), s);
+    r = Walk(MeshContent(), {.box = ZonMathBox(-1, 6, -1, 1, -1, 1)});  // upper faces closed on the file's highs
+    ASSERT_EQ(r.body->GetPolygons().size(), 2u);
     EXPECT_EQ(r.body->GetPolygons()[0]->Triangles(), (std::vector<unsigned>{0, 1, 2, 0, 2, 3}));
     EXPECT_EQ(r.body->GetPolygons()[1]->GetNumberOfVertices(), 3u);
-}
 
-TEST(ImportEngine, TrianglesPastTheVerticesAreLeftOutWithANote)
-{
-    MemoryContent c = MeshContent();
-    c.meshes[0].triangles = {0, 1, 2, 0, 2, 4};
-    const Import r = Walk(std::make_shared<MemoryReader>("f", c));
+    MemoryContent broken = MeshContent();  // a triangle past the vertices is left out, with a note
+    broken.meshes[0].triangles = {0, 1, 2, 0, 2, 4};
+    r = Walk(broken);
     EXPECT_EQ(r.body->GetPolygons()[0]->Triangles(), (std::vector<unsigned>{0, 1, 2}));
     ASSERT_EQ(r.messages.size(), 1u);
     EXPECT_NE(r.messages[0].find(": 1"), std::string::npos);
@@ -295,7 +229,7 @@ TEST(ImportEngine, AReaderWithoutTheInterfaceOfItsTypeIsReadAsACloud)
 {
     const std::pair<MemoryContent, std::size_t> cases[] = {{ScanContent(), 9}, {GridContent(), 8}, {MeshContent(), 7}};
     for (const auto& [content, points] : cases) {
-        const Import r = Walk(std::make_shared<MemoryCloudReader>("f", content));
+        const Import r = Walk<MemoryCloudReader>(content);
         ASSERT_EQ(r.body->GetClouds().size(), 1u);
         EXPECT_EQ(r.body->GetNumberOfPoints(), points);
         EXPECT_EQ(r.body->GetTypeOfDigitization(), content.type);
@@ -304,14 +238,10 @@ TEST(ImportEngine, AReaderWithoutTheInterfaceOfItsTypeIsReadAsACloud)
 
 TEST(ImportEngine, StatisticsNameWhatWasCreated)
 {
-    Settings s;
-    s.scale = 2.0;
-    const Import r = Walk(std::make_shared<MemoryReader>("f", ScanContent()), s);
-    EXPECT_NE(r.statistics.find("  Points: 9\n"), std::string::npos) << r.statistics;
-    EXPECT_NE(r.statistics.find("  Sets of scans: 2\n"), std::string::npos);
-    EXPECT_NE(r.statistics.find("  Scans: 3\n"), std::string::npos);
-    EXPECT_NE(r.statistics.find("  Unit: mm\n"), std::string::npos);
-    EXPECT_NE(r.statistics.find("  Bounding box: 0 0 0 / 46 92 138\n"), std::string::npos);
+    const Import r = Walk(ScanContent(), {.scale = 2.0});
+    for (const char* line : {"  Points: 9\n", "  Sets of scans: 2\n", "  Scans: 3\n", "  Unit: mm\n",
+                             "  Bounding box: 0 0 0 / 46 92 138\n"})
+        EXPECT_NE(r.statistics.find(line), std::string::npos) << line << r.statistics;
     EXPECT_EQ(r.statistics.find("Grids"), std::string::npos);
 }
 
@@ -319,12 +249,7 @@ TEST(ImportEngine, ReaderErrorsPassThrough)
 {
     MemoryContent c = ScanContent();
     c.failInPoints = true;
-    try {
-        Walk(std::make_shared<MemoryReader>("f", c));
-        FAIL() << "no error";
-    } catch (const ZonError& error) {
-        EXPECT_EQ(error.GetMessageKey(), "ZonCloudReadNLSTool.ERR_UnknownData");
-    }
+    EXPECT_EQ(zontest::ErrorKey([&] { Walk(c); }), "ZonCloudReadNLSTool.ERR_UnknownData");
 }
 
 }  // namespace
