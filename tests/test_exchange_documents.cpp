@@ -1,36 +1,25 @@
-// Exchange documents: the in-memory model and the document built from a
-// cloud body, as the exporters see it.
+// Exchange documents built from a cloud body, as the exporters see them.
 #include <gtest/gtest.h>
 
-#include <filesystem>
-#include <string>
-#include <vector>
-
-#include <unistd.h>
-
-#include "ZonCldSTLOutputDocument.h"
 #include "ZonExchBodyDocumentBuilder.h"
 #include "ZonExchMemoryDocument.h"
 #include "ZonGeoFactoryProtected.h"
 #include "ZonIExchInstance.h"
 #include "ZonIExchProductStructure.h"
 #include "ZonIExchTessRep.h"
-#include "ZonIReporter.h"
-
-namespace fs = std::filesystem;
 
 namespace {
 
-ZonCldPolygon_var Triangle(ZonGeoFactoryProtected& factory, bool doublePrecision)
+const double kXyz[12] = {0, 0, 0, 1, 0, 0, 0, 1, 0, 1, 1, 0.5};
+
+ZonCldPolygon_var Polygon(ZonGeoFactoryProtected& factory, bool doublePrecision)
 {
     auto polygon = factory.CreatePolygon();
-    const double xyz[12] = {0, 0, 0, 1, 0, 0, 0, 1, 0, 1, 1, 0.5};
-    if (doublePrecision) {
-        polygon->Vertices().AssignScaled(xyz, 4, 1.0);
-    } else {
-        const float single[12] = {0, 0, 0, 1, 0, 0, 0, 1, 0, 1, 1, 0.5f};
+    const float single[12] = {0, 0, 0, 1, 0, 0, 0, 1, 0, 1, 1, 0.5f};
+    if (doublePrecision)
+        polygon->Vertices().AssignScaled(kXyz, 4, 1.0);
+    else
         polygon->Vertices().AssignScaled(single, 4, 1.0);
-    }
     polygon->Triangles() = {0, 1, 2, 1, 3, 2};
     return polygon;
 }
@@ -61,65 +50,57 @@ std::vector<int> TopNodeTypes(ZonIExchTessRep& rep)
     return types;
 }
 
-ZonIExchTessRep_var TessRepOf(ZonIExchInputDocument& document)
-{
-    return ZonQueryInterface<ZonIExchTessRep>(document.GetRepresentation(ZonIExchTessRep::RepresentationType));
-}
-
+// A polygon becomes a solid with one face of triangles, in both precisions
+// when its vertices are doubles; clouds, scans and grids their node types.
 TEST(BodyDocument, PolygonsBecomeSolidsWithOneFaceAndOtherEntitiesTheirNodeTypes)
 {
-    ZonGeoFactoryProtected factory;
-    ZonCldBody body;
-    body.AddCloud(Cloud(factory));
-    auto scans = factory.CreateSetOfScans();
-    scans->AddScan(factory.CreateScan());
-    scans->AddScan(factory.CreateScan());
-    body.AddSetOfScans(scans);
-    body.AddSetOfGrids(Grids(factory));
-    body.AddPolygon(Triangle(factory, false));
+    for (const bool doublePrecision : {false, true}) {
+        SCOPED_TRACE(doublePrecision ? "double" : "single");
+        ZonGeoFactoryProtected factory;
+        ZonCldBody body;
+        body.AddCloud(Cloud(factory));
+        auto scans = factory.CreateSetOfScans();
+        scans->AddScan(factory.CreateScan());
+        scans->AddScan(factory.CreateScan());
+        body.AddSetOfScans(scans);
+        body.AddSetOfGrids(Grids(factory));
+        body.AddPolygon(Polygon(factory, doublePrecision));
 
-    auto document = ZonExchBodyDocumentBuilder::Build(body, "sample");
-    EXPECT_EQ(document->GetAliasName(), ZonUnicodeString("sample"));
-    EXPECT_FALSE(document->HasRepresentation(ZonIExchProductStructure::RepresentationType));
-    auto rep = TessRepOf(*document);
-    ASSERT_TRUE(rep);
-    EXPECT_FALSE(rep->HasDoublePrecision());
-    EXPECT_EQ(TopNodeTypes(*rep), (std::vector<int>{ZonExchNodeSolid, ZonExchNodeCloud, ZonExchNodeScan,
-                                                    ZonExchNodeScan, ZonExchNodeGrid}));
+        auto document = ZonExchBodyDocumentBuilder::Build(body, "sample");
+        EXPECT_EQ(document->GetAliasName(), ZonUnicodeString("sample"));
+        EXPECT_FALSE(document->HasRepresentation(ZonIExchProductStructure::RepresentationType));
+        auto rep = ZonQueryInterface<ZonIExchTessRep>(document->GetRepresentation(ZonIExchTessRep::RepresentationType));
+        ASSERT_TRUE(rep);
+        EXPECT_EQ(rep->HasDoublePrecision(), doublePrecision);
+        EXPECT_EQ(TopNodeTypes(*rep), (std::vector<int>{ZonExchNodeSolid, ZonExchNodeCloud, ZonExchNodeScan,
+                                                        ZonExchNodeScan, ZonExchNodeGrid}));
 
-    auto solid = rep->GetTopNode(0);
-    ASSERT_EQ(solid->GetNumberOfFaces(), 1u);
-    auto face = solid->GetFace(0);
-    unsigned values = 0, triangles = 0;
-    const float* coords = face->GetCoords(values);
-    ASSERT_EQ(values, 12u);
-    EXPECT_EQ(std::vector<float>(coords, coords + values), (std::vector<float>{0, 0, 0, 1, 0, 0, 0, 1, 0, 1, 1, 0.5f}));
-    const unsigned* offsets = face->GetTriangles(triangles);
-    ASSERT_EQ(triangles, 2u);
-    EXPECT_EQ(std::vector<unsigned>(offsets, offsets + 6), (std::vector<unsigned>{0, 3, 6, 3, 9, 6}));
-    EXPECT_EQ(face->GetCoordsDouble(values), nullptr);
-    EXPECT_EQ(face->GetNumberOfStrips() + face->GetNumberOfFans(), 0u);
-}
-
-TEST(BodyDocument, DoublePrecisionVerticesGiveBothCoordinateArrays)
-{
-    ZonGeoFactoryProtected factory;
-    ZonCldBody body;
-    body.AddPolygon(Triangle(factory, true));
-    auto rep = TessRepOf(*ZonExchBodyDocumentBuilder::Build(body, "d"));
-    EXPECT_TRUE(rep->HasDoublePrecision());
-    unsigned values = 0;
-    const double* coords = rep->GetTopNode(0)->GetFace(0)->GetCoordsDouble(values);
-    ASSERT_EQ(values, 12u);
-    EXPECT_EQ(coords[11], 0.5);
-    EXPECT_NE(rep->GetTopNode(0)->GetFace(0)->GetCoords(values), nullptr);
+        auto solid = rep->GetTopNode(0);
+        ASSERT_EQ(solid->GetNumberOfFaces(), 1u);
+        auto face = solid->GetFace(0);
+        unsigned values = 0, triangles = 0;
+        const float* coords = face->GetCoords(values);
+        ASSERT_EQ(values, 12u);
+        EXPECT_EQ(std::vector<float>(coords, coords + values), (std::vector<float>{0, 0, 0, 1, 0, 0, 0, 1, 0, 1, 1, 0.5f}));
+        const double* doubles = face->GetCoordsDouble(values);
+        if (doublePrecision) {
+            ASSERT_EQ(values, 12u);
+            EXPECT_EQ(std::vector<double>(doubles, doubles + values), std::vector<double>(kXyz, kXyz + 12));
+        } else {
+            EXPECT_EQ(doubles, nullptr);
+        }
+        const unsigned* offsets = face->GetTriangles(triangles);
+        ASSERT_EQ(triangles, 2u);
+        EXPECT_EQ(std::vector<unsigned>(offsets, offsets + 6), (std::vector<unsigned>{0, 3, 6, 3, 9, 6}));
+        EXPECT_EQ(face->GetNumberOfStrips() + face->GetNumberOfFans(), 0u);
+    }
 }
 
 TEST(BodyDocument, PlacedBodyIsAProductStructureWithOneInstanceAtThePlacement)
 {
     ZonGeoFactoryProtected factory;
     ZonCldBody body;
-    body.AddPolygon(Triangle(factory, false));
+    body.AddPolygon(Polygon(factory, false));
     const ZonMathTransformation placement({1, 0, 0, 0, 1, 0, 0, 0, 1}, {1e6 + 0.25, 0, 0});
     body.SetPlacement(placement);
     auto document = ZonExchBodyDocumentBuilder::Build(body, "placed");
@@ -135,74 +116,6 @@ TEST(BodyDocument, PlacedBodyIsAProductStructureWithOneInstanceAtThePlacement)
     EXPECT_EQ(instance->GetPosition(), placement);  // kept in double precision
     ASSERT_TRUE(instance->GetProduct()->HasTessellatedRep());
     EXPECT_EQ(TopNodeTypes(*instance->GetProduct()->GetTessellatedRep()), std::vector<int>{ZonExchNodeSolid});
-}
-
-TEST(MemoryDocument, AnnouncedButMissingRepresentationsAndAttributes)
-{
-    ZonExchMemoryDocument document("doc");
-    EXPECT_FALSE(document.HasRepresentation("TessellatedRepresentation"));
-    document.SetRepresentation("TessellatedRepresentation", nullptr);
-    EXPECT_TRUE(document.HasRepresentation("TessellatedRepresentation"));
-    EXPECT_EQ(document.GetRepresentation("TessellatedRepresentation"), nullptr);
-    EXPECT_EQ(document.GetAttribute("CAD_Format"), "");
-    document.SetAttribute("CAD_Format", "3MF");
-    EXPECT_EQ(document.GetAttribute("CAD_Format"), "3MF");
-}
-
-// What the STL export of a built body reports, and whether the file stays.
-class BodyExportTest : public ::testing::Test {
-protected:
-    void SetUp() override
-    {
-        dir_ = fs::temp_directory_path() / ("zon_body_export_" + std::to_string(::getpid()));
-        fs::create_directories(dir_);
-        ZonSession::OpenSession();
-        ZonSession::GetPtrSession()->SetReporter(reporter_);
-    }
-    void TearDown() override { fs::remove_all(dir_); }
-
-    std::vector<ZonCollectingReporter::Entry> Export(const ZonCldBody& body, const std::string& path)
-    {
-        reporter_->Clear();
-        ZonCldSTLOutputDocument output;
-        output.SetFileName(path);
-        EXPECT_EQ(output.Open(), ZON_S_OK);
-        EXPECT_EQ(output.Write(ZonExchBodyDocumentBuilder::Build(body, "body")), ZON_S_OK);
-        output.Close();
-        output.Release();
-        return reporter_->Entries();
-    }
-
-    fs::path dir_;
-    std::shared_ptr<ZonCollectingReporter> reporter_ = std::make_shared<ZonCollectingReporter>();
-};
-
-TEST_F(BodyExportTest, MeshAndCloudWritesTheMeshAndReportsTheSkippedCloud)
-{
-    ZonGeoFactoryProtected factory;
-    ZonCldBody body;
-    body.AddPolygon(Triangle(factory, false));
-    body.AddCloud(Cloud(factory));
-    const std::string path = (dir_ / "mesh_cloud.stl").string();
-    const auto entries = Export(body, path);
-    ASSERT_EQ(entries.size(), 2u);
-    EXPECT_EQ(entries[0].key, "ZonCldExportCmd.ERR_NotInMeshFile_Cloud");
-    EXPECT_EQ(entries[0].severity, 4);
-    EXPECT_EQ(entries[1].key, "ZonCldExportCmd.Partial");
-    EXPECT_EQ(fs::file_size(path), 84u + 2 * 50u);
-}
-
-TEST_F(BodyExportTest, GridOnlyLeavesNoFileAndReportsTheSkippedGrid)
-{
-    ZonGeoFactoryProtected factory;
-    ZonCldBody body;
-    body.AddSetOfGrids(Grids(factory));
-    const std::string path = (dir_ / "grid.stl").string();
-    const auto entries = Export(body, path);
-    ASSERT_EQ(entries.size(), 2u);
-    EXPECT_EQ(entries[0].key, "ZonCldExportCmd.ERR_NotInMeshFile_Grid");
-    EXPECT_EQ(entries[1].key, "ZonCldExportCmd.Empty");
-    EXPECT_FALSE(fs::exists(path));
 }
 
 }  // namespace
