@@ -7,10 +7,10 @@
 #include <cstring>
 #include <limits>
 #include <new>
-#include <stdexcept>
 
 #include "ZonCloudOperErrorTool.h"
 #include "ZonCloudReadNLSTool.h"
+#include "ZonCloudReadTextTool.h"
 #include "ZonCloudScanFormat.h"
 
 namespace {
@@ -122,28 +122,6 @@ void ReadInteger(const Token& token, std::int32_t& target)
     integerFormat(token.text, '.', &target);
 }
 
-template <class T>
-void ReserveOrThrow(std::vector<T>& v, std::uint64_t n)
-{
-    try {
-        if (n > v.max_size()) ZonCloudOperErrorTool::ThrowInsufficientMemory();
-        v.reserve(static_cast<std::size_t>(n));
-    } catch (const std::bad_alloc&) {
-        ZonCloudOperErrorTool::ThrowInsufficientMemory();
-    } catch (const std::length_error&) {
-        ZonCloudOperErrorTool::ThrowInsufficientMemory();
-    }
-}
-
-// Closes the reader's file however the load ends.
-template <class Close>
-struct ScopeExit {
-    Close close;
-    ~ScopeExit() { close(); }
-};
-template <class Close>
-ScopeExit(Close) -> ScopeExit<Close>;
-
 }  // namespace
 
 // The values one data line gives; the colour and symbol indices live in the
@@ -202,7 +180,7 @@ void ZonCloudReadAsciiUserFormat::ReadFDF()
     errno = 0;
     FILE* fdf = std::fopen(_fdfPath.c_str(), "rb");
     if (!fdf) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, nullptr);
-    ScopeExit closer{[fdf] { std::fclose(fdf); }};
+    ZonCloudReadTextTool::FileCloser closer{fdf};
 
     char line[FdfLineSize] = {};
     if (!std::fgets(line, sizeof line, fdf)) {
@@ -231,18 +209,7 @@ void ZonCloudReadAsciiUserFormat::ReadFDF()
 
 void ZonCloudReadAsciiUserFormat::Discard()
 {
-    _points.clear();
-    _points.shrink_to_fit();
-    _pointsDouble.clear();
-    _pointsDouble.shrink_to_fit();
-    _colors.clear();
-    _colors.shrink_to_fit();
-    _alphas.clear();
-    _alphas.shrink_to_fit();
-    _symbols.clear();
-    _symbols.shrink_to_fit();
-    _texts.clear();
-    _texts.shrink_to_fit();
+    ZonCloudReadTextTool::Free(_points, _pointsDouble, _colors, _alphas, _symbols, _texts);
     _count = 0;
     _capacity = 0;
     _hasColor = _hasAlpha = _hasSymbol = _hasText = false;
@@ -270,17 +237,8 @@ bool ZonCloudReadAsciiUserFormat::Prepare(bool wantDouble)
 
 std::uint64_t ZonCloudReadAsciiUserFormat::EstimateCapacity(std::uint64_t fileSize)
 {
-    char line[DataLineSize];
-    std::uint64_t lines = 0;
-    long offset = 0;
-    while (lines < SampleLines && std::fgets(line, sizeof line, _file)) {
-        ++lines;
-        offset = std::ftell(_file);
-    }
-    std::clearerr(_file);
+    const std::uint64_t average = ZonCloudReadTextTool::AverageLineLength(_file, SampleLines, DataLineSize);
     RewindFile();
-    if (lines == 0 || offset <= 0) return 0;
-    const std::uint64_t average = static_cast<std::uint64_t>(offset) / lines;
     if (average == 0) return 0;
     // A complete line holds one token per column and a separator between
     // them, so no file has more points than this; the estimate never asks
@@ -295,7 +253,7 @@ void ZonCloudReadAsciiUserFormat::Load(bool asDouble)
     Discard();
     _loadedAsDouble = asDouble;
     OpenFile();
-    ScopeExit closer{[this] { CloseFile(); }};
+    ZonCloudReadTextTool::FileCloser closer{_file};
     std::setvbuf(_file, nullptr, _IOFBF, 1 << 20);
 
     _completeLines = 0;
@@ -303,12 +261,9 @@ void ZonCloudReadAsciiUserFormat::Load(bool asDouble)
     // The product k * r is taken in double precision from the float ratio.
     const double ratio = static_cast<float>(_samplingPercent / 100.0f);
 
-    errno = 0;
-    if (std::fseek(_file, 0, SEEK_END) != 0) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Input, nullptr);
-    const long size = std::ftell(_file);
-    if (size < 0) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Input, nullptr);
+    const std::uint64_t size = ZonCloudReadTextTool::FileSize(_file);
     RewindFile();
-    _estimate = EstimateCapacity(static_cast<std::uint64_t>(size));
+    _estimate = EstimateCapacity(size);
 
     _colorIndex = 3;
     _symbolIndex = 0;
@@ -320,13 +275,7 @@ void ZonCloudReadAsciiUserFormat::Load(bool asDouble)
         bool complete = false;
         ParseLine(line, values, complete);
         if (!complete) {
-            if (_completeLines == 0) {
-                _dataStart = std::ftell(_file);
-                if (_dataStart < 0) {
-                    _dataStart = 0;
-                    std::clearerr(_file);
-                }
-            }
+            if (_completeLines == 0) _dataStart = ZonCloudReadTextTool::LineEnd(_file);
             continue;
         }
         const auto above255 = [](std::int32_t v) { return static_cast<std::uint32_t>(v) > 255u; };
@@ -458,13 +407,13 @@ void ZonCloudReadAsciiUserFormat::Grow()
 {
     const std::uint64_t capacity = (_capacity == 0 && _estimate != 0) ? _estimate : _capacity + GrowthStep;
     if (_loadedAsDouble)
-        ReserveOrThrow(_pointsDouble, 3 * capacity);
+        ZonCloudReadTextTool::Reserve(_pointsDouble, 3 * capacity);
     else
-        ReserveOrThrow(_points, 3 * capacity);
-    if (_fieldsHaveColor && _keepColors) ReserveOrThrow(_colors, 3 * capacity);
-    if (_fieldsHaveAlpha) ReserveOrThrow(_alphas, capacity);
-    if (_fieldsHaveSymbol) ReserveOrThrow(_symbols, capacity);
-    if (_fieldsHaveText) ReserveOrThrow(_texts, capacity);
+        ZonCloudReadTextTool::Reserve(_points, 3 * capacity);
+    if (_fieldsHaveColor && _keepColors) ZonCloudReadTextTool::Reserve(_colors, 3 * capacity);
+    if (_fieldsHaveAlpha) ZonCloudReadTextTool::Reserve(_alphas, capacity);
+    if (_fieldsHaveSymbol) ZonCloudReadTextTool::Reserve(_symbols, capacity);
+    if (_fieldsHaveText) ZonCloudReadTextTool::Reserve(_texts, capacity);
     _capacity = capacity;
 }
 

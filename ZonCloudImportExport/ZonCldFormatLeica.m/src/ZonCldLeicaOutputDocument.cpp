@@ -1,10 +1,6 @@
 #include "ZonCldLeicaOutputDocument.h"
 
 #include "ZonCloudPrintFormat.h"
-#include "ZonCloudReadNLSTool.h"
-#include "ZonCloudScanFormat.h"
-#include "ZonExchPointWalker.h"
-#include "ZonIReporter.h"
 #include "ZonObjectRegistry.h"
 
 namespace {
@@ -12,73 +8,10 @@ const ZonRegistration Registration("CLD_AsciiRGB_OutputDocument", ZonIExchOutput
                                    [] { return std::make_shared<ZonCldLeicaOutputDocument>(); });
 }
 
-ZonCldLeicaOutputDocument::~ZonCldLeicaOutputDocument() { CloseStream(); }
-
-void ZonCldLeicaOutputDocument::CloseStream()
+void ZonCldLeicaOutputDocument::WritePoint(double x, double y, double z, const unsigned char* rgb)
 {
-    if (!_stream) return;
-    std::fclose(_stream);
-    _stream = nullptr;
-}
-
-ZonHResult ZonCldLeicaOutputDocument::SetFileName(const ZonUnicodeString& fileName)
-{
-    _fileName = fileName;
-    return ZON_S_OK;
-}
-
-ZonHResult ZonCldLeicaOutputDocument::SetOptions(const ZonListValZonString& names, const ZonListValZonString& values)
-{
-    if (names.size() != values.size()) return ZON_E_FAIL;
-    for (std::size_t i = 0; i < names.size(); ++i) {
-        // An unreadable factor leaves the one in force.
-        if (names[i] == "Scaling" && !values[i].empty()) ZonScan(values[i].c_str(), '.', "%le", &_scale);
-        if (names[i] == "Precision") _readDouble = values[i] == "precDouble";
-    }
-    return ZON_S_OK;
-}
-
-ZonHResult ZonCldLeicaOutputDocument::Open()
-{
-    CloseStream();
-    if (_fileName.IsNull()) return ZON_E_FAIL;
-    _stream = std::fopen(_fileName.c_str(), "w");
-    return _stream ? ZON_S_OK : ZON_E_FAIL;
-}
-
-ZonHResult ZonCldLeicaOutputDocument::Write(const ZonIExchInputDocument_var& document)
-{
-    if (!document) return ZON_E_FAIL;
-    if (!_stream) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Input, "No File");
-    const double scale = _scale != 0.0 ? _scale : 1.0;
-    const bool read = ZonExchPointWalker::Walk(*document, _readDouble, [&](const ZonMathPoint& p, const unsigned char* rgb) {
-        const double x = p[0] * scale, y = p[1] * scale, z = p[2] * scale;
-        if (rgb)
-            ZonPrintFile(_stream, "%f %f %f %d %d %d \n", x, y, z, rgb[0], rgb[1], rgb[2]);
-        else
-            ZonPrintFile(_stream, "%f %f %f\n", x, y, z);
-        ++_written;
-    });
-    return read ? ZON_S_OK : ZON_E_FAIL;
-}
-
-ZonHResult ZonCldLeicaOutputDocument::Close()
-{
-    CloseStream();
-    return ZON_S_OK;
-}
-
-ZonHResult ZonCldLeicaOutputDocument::Release()
-{
-    Close();
-    ZonSession* session = ZonSession::GetPtrSession();
-    const ZonIReporter_var reporter = session ? session->GetReporter() : nullptr;
-    if (!reporter) return ZON_S_OK;
-    const char* code = _written ? "ZonCldExportCmd.ERR_FILESUCCESSFULL" : "ZonCldExportCmd.ERR_NoActivePoints";
-    ZonError outcome(code, "ZonCldExportCmd");
-    outcome.SetSeverity(_written ? 1 : 4);
-    outcome.SetParameters({_fileName.ToUtf8()});
-    reporter->BeginReport();
-    reporter->Report(outcome);
-    return ZON_S_OK;
+    if (rgb)
+        ZonPrintFile(_stream, "%f %f %f %d %d %d \n", x, y, z, rgb[0], rgb[1], rgb[2]);
+    else
+        ZonPrintFile(_stream, "%f %f %f\n", x, y, z);
 }

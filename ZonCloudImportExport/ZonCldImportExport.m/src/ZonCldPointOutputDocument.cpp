@@ -1,0 +1,76 @@
+#include "ZonCldPointOutputDocument.h"
+
+#include "ZonCloudReadNLSTool.h"
+#include "ZonCloudScanFormat.h"
+#include "ZonExchPointWalker.h"
+#include "ZonIReporter.h"
+
+ZonCldPointOutputDocument::~ZonCldPointOutputDocument() { CloseStream(); }
+
+void ZonCldPointOutputDocument::CloseStream()
+{
+    if (!_stream) return;
+    std::fclose(_stream);
+    _stream = nullptr;
+}
+
+ZonHResult ZonCldPointOutputDocument::SetFileName(const ZonUnicodeString& fileName)
+{
+    _fileName = fileName;
+    return ZON_S_OK;
+}
+
+ZonHResult ZonCldPointOutputDocument::SetOptions(const ZonListValZonString& names, const ZonListValZonString& values)
+{
+    if (names.size() != values.size()) return ZON_E_FAIL;
+    for (std::size_t i = 0; i < names.size(); ++i) {
+        // An unreadable factor leaves the one in force.
+        if (names[i] == "Scaling" && !values[i].empty()) ZonScan(values[i].c_str(), '.', "%le", &_scale);
+        if (names[i] == "Precision") _readDouble = values[i] == "precDouble";
+    }
+    return ZON_S_OK;
+}
+
+ZonHResult ZonCldPointOutputDocument::Open()
+{
+    CloseStream();
+    if (_fileName.IsNull()) return ZON_E_FAIL;
+    _stream = std::fopen(_fileName.c_str(), "w");
+    if (!_stream) return ZON_E_FAIL;
+    BeginFile();
+    return ZON_S_OK;
+}
+
+ZonHResult ZonCldPointOutputDocument::Write(const ZonIExchInputDocument_var& document)
+{
+    if (!document) return ZON_E_FAIL;
+    if (!_stream) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Input, "No File");
+    const double scale = _scale != 0.0 ? _scale : 1.0;
+    const bool read = ZonExchPointWalker::Walk(*document, _readDouble, [&](const ZonMathPoint& p, const unsigned char* rgb) {
+        WritePoint(p[0] * scale, p[1] * scale, p[2] * scale, rgb);
+        ++_written;
+    });
+    return read ? ZON_S_OK : ZON_E_FAIL;
+}
+
+ZonHResult ZonCldPointOutputDocument::Close()
+{
+    if (_stream) EndFile();
+    CloseStream();
+    return ZON_S_OK;
+}
+
+ZonHResult ZonCldPointOutputDocument::Release()
+{
+    Close();
+    ZonSession* session = ZonSession::GetPtrSession();
+    const ZonIReporter_var reporter = session ? session->GetReporter() : nullptr;
+    if (!reporter) return ZON_S_OK;
+    const char* code = _written ? "ZonCldExportCmd.ERR_FILESUCCESSFULL" : "ZonCldExportCmd.ERR_NoActivePoints";
+    ZonError outcome(code, "ZonCldExportCmd");
+    outcome.SetSeverity(_written ? 1 : 4);
+    outcome.SetParameters({_fileName.ToUtf8()});
+    reporter->BeginReport();
+    reporter->Report(outcome);
+    return ZON_S_OK;
+}

@@ -1,0 +1,58 @@
+#pragma once
+#include <cstdint>
+#include <vector>
+
+#include "ZonCldExport.h"
+#include "ZonCloudReadFile.h"
+
+// Base of the readers of text files with one point per line: an optional
+// first line with the number of points, then point lines up to an optional
+// "**end cloud**" line. A file that only makes sense with the other decimal
+// point ('.' or ',') is read again with it after 200 lines in a row that are
+// not understood. The file is loaded at once into one cloud, in the precision
+// asked for, with a colour per point when the format gives one.
+class ZON_CLD_API ZonCloudReadPointLines : public ZonCloudReadFile {
+public:
+    // ZonICloudReadFile
+    void SetSamplingPercent(float percent) override;
+    bool HasDoublePrecision() override { return true; }
+
+    // Room of the loaded arrays, in points: the count line's number when the
+    // file has one, else what the size estimate and growth gave.
+    std::uint64_t GetCapacity() const { return _capacity; }
+    long GetDataStartOffset() const { return _dataStart; }
+    bool IsDecimalPointSwapped() const { return _decimalSwapped; }
+
+protected:
+    explicit ZonCloudReadPointLines(const ZonUnicodeString& fileName);
+
+    // Scans one line in the precision being loaded: false when it is no point.
+    // rgb is the point's colour, used when colours are kept.
+    virtual bool ScanLine(const char* line, char decimalPoint, double xyz[3], unsigned char rgb[3]) = 0;
+    // Forgets what was loaded; a format that keeps more forgets that too.
+    virtual void Discard();
+    void Analyse() override;
+    void Load(bool asDouble);
+
+    static constexpr int LineSize = 512;  // lines of at most 511 characters
+    static constexpr const char* EndOfCloud = "**end cloud**";
+
+    bool _keepColors = false;
+    bool _loadedAsDouble = false;
+    std::vector<float> _points;
+    std::vector<double> _pointsDouble;
+    std::vector<unsigned char> _colors;
+    std::uint64_t _count = 0;  // points of the loaded arrays
+    std::int64_t _pointLines = 0;
+    long _dataStart = 0;
+
+private:
+    // One pass over the file; false when it must start again with the other decimal point.
+    bool ReadPass(char decimalPoint, double ratio);
+    void Reserve(std::uint64_t capacity);
+
+    bool _decimalSwapped = false;
+    std::uint64_t _capacity = 0;
+    std::uint64_t _estimate = 0;
+    std::uint64_t _mostPoints = 0;
+};
