@@ -1,21 +1,11 @@
 // RGB point files: the colour rules, the count line, the decimal swap after
-// 200 unknown lines, the writer's bytes and its round trip.
+// 200 unknown lines, the writers' bytes and their round trip.
 #include <gtest/gtest.h>
-
-#include <cstdlib>
-#include <filesystem>
-#include <fstream>
-#include <functional>
-#include <sstream>
-#include <string>
-#include <vector>
 
 #include "ZonCldSettings.h"
 #include "ZonCloudFactoryLeica.h"
 #include "ZonCloudReadLeica.h"
 #include "ZonCloudWriteLeica.h"
-#include "ZonCldLeicaOutputDocument.h"
-#include "ZonError.h"
 #include "ZonExchMemoryDocument.h"
 #include "ZonExchMemoryInstance.h"
 #include "ZonExchMemoryPointFace.h"
@@ -23,178 +13,105 @@
 #include "ZonExchMemoryProductStructure.h"
 #include "ZonExchMemoryTessNode.h"
 #include "ZonExchMemoryTessRep.h"
-#include "ZonIExchProductStructure.h"
+#include "ZonIExchOutputDocument.h"
 #include "ZonIReporter.h"
 #include "ZonObjectRegistry.h"
-
-namespace fs = std::filesystem;
+#include "ZonTestFiles.h"
 
 namespace {
 
-class RgbPoints : public ::testing::Test {
-protected:
-    void SetUp() override
-    {
-        char pattern[] = "/tmp/zon_rgb_XXXXXX";
-        ASSERT_NE(mkdtemp(pattern), nullptr);
-        dir_ = pattern;
-        ZonCldSettings::Instance().ResetAll();
-    }
-    void TearDown() override
-    {
-        fs::remove_all(dir_);
-        ZonCldSettings::Instance().ResetAll();
-    }
+using zontest::ErrorKey;
+using zontest::PointsOf;
+using zontest::Repeat;
+using zontest::Slurp;
+using Doubles = std::vector<double>;
+using Ints = std::vector<int>;
 
-    std::string Write(const std::string& name, const std::string& content)
-    {
-        const std::string path = (dir_ / name).string();
-        std::ofstream(path, std::ios::binary) << content;
-        return path;
-    }
-    static std::string Read(const std::string& path)
-    {
-        std::ifstream in(path, std::ios::binary);
-        std::stringstream text;
-        text << in.rdbuf();
-        return text.str();
-    }
-    static std::vector<double> Points(ZonCloudReadLeica& reader)
-    {
-        unsigned n = 0;
-        const double* p = reader.GetPointsDouble(n);
-        return std::vector<double>(p, p + 3 * n);
-    }
-    static std::vector<int> Colors(ZonCloudReadLeica& reader)
-    {
-        unsigned n = 0;
-        const unsigned char* c = reader.GetPointColors(n);
-        return std::vector<int>(c, c + 3 * n);
-    }
-    static std::string ErrorKey(const std::function<void()>& call)
-    {
-        try {
-            call();
-        } catch (const ZonError& error) {
-            return error.GetMessageKey();
-        }
-        return "";
-    }
+Ints Colors(ZonICloudReadFile& reader)
+{
+    unsigned n = 0;
+    const unsigned char* c = reader.GetPointColors(n);
+    return Ints(c, c + 3 * n);
+}
 
-    fs::path dir_;
-};
+class RgbPoints : public zontest::FilesTest {};
 
 TEST_F(RgbPoints, ColourRulesForThreeToSevenValues)
 {
     const struct {
         std::string line;
-        std::vector<int> color;
+        Ints color;
     } cases[] = {
         {"1 2 3 10 20 30", {10, 20, 30}},
-        {"1 2 3 99 10 20 30", {10, 20, 30}},    // intensity, then the colour
-        {"1 2 3 300 20 30", {255, 255, 255}},   // six values, the first out of range
+        {"1 2 3 99 10 20 30", {10, 20, 30}},   // intensity, then the colour
+        {"1 2 3 300 20 30", {255, 255, 255}},  // six values, the first out of range
         {"1 2 3 10 20 30 256", {255, 255, 255}},
-        {"1 2 3 10 20 300", {10, 20, 255}},     // six values, the fourth in range: a component above 255 saturates
+        {"1 2 3 10 20 300", {10, 20, 255}},  // six values, the fourth in range: a component above 255 saturates
         {"1 2 3", {255, 255, 255}},
         {"1 2 3 10 20", {255, 255, 255}},
-        {"1 2 3 1.5 20 30", {255, 255, 255}},   // the intensity ends the integers
+        {"1 2 3 1.5 20 30", {255, 255, 255}},  // the intensity ends the integers
     };
     for (const auto& c : cases) {
         ZonCloudReadLeica reader(Write("p.asc_rgb", c.line + "\n"));
-        EXPECT_EQ(Points(reader), (std::vector<double>{1, 2, 3})) << c.line;
+        EXPECT_EQ(PointsOf(reader), (Doubles{1, 2, 3})) << c.line;
         EXPECT_EQ(Colors(reader), c.color) << c.line;
     }
-}
 
-TEST_F(RgbPoints, ColoursCanBeLeftOut)
-{
-    ZonCloudReadLeica reader(Write("p.asc_rgb", "1 2 3 10 20 30\n"));
-    EXPECT_EQ(Colors(reader), (std::vector<int>{10, 20, 30}));
-    reader.SetKeepColors(false);
-    EXPECT_FALSE(reader.GetKeepColors());
-    EXPECT_EQ(Colors(reader), std::vector<int>{});
-    EXPECT_EQ(Points(reader), (std::vector<double>{1, 2, 3}));
-
+    // The factory leaves colours out when the settings say so.
     ZonCldSettings::Instance().SetBool("KeepColors", false);
-    const auto fromFactory = ZonCloudFactoryLeica().CreateReader(Write("q.asc_rgb", "1 2 3 10 20 30\n"));
     unsigned n = 0;
-    EXPECT_EQ(fromFactory->GetPointColors(n), nullptr);
-    EXPECT_EQ(n, 0u);
+    EXPECT_EQ(ZonCloudFactoryLeica().CreateReader(Path("p.asc_rgb"))->GetPointColors(n), nullptr);
+    ZonCldSettings::Instance().ResetAll();
 }
 
-TEST_F(RgbPoints, CountLinePresizesTheArrays)
+TEST_F(RgbPoints, CountLineEndLineEstimateAndSampling)
 {
-    ZonCloudReadLeica reader(Write("p.asc_rgb", "5\n1 1 1\n2 2 2\n3 3 3\n4 4 4\n5 5 5\n"));
-    EXPECT_EQ(reader.GetNumberOfPoints(), 5);
+    ZonCloudReadLeica reader(Write("p.asc_rgb", "5\n1 1 1\n2 2 2\n3 3 3\n**end cloud**\n4 4 4\n"));
+    EXPECT_EQ(PointsOf(reader), (Doubles{1, 1, 1, 2, 2, 2, 3, 3, 3}));
     EXPECT_EQ(reader.GetCapacity(), 5u);
     EXPECT_EQ(reader.GetDataStartOffset(), 2);
 
     // Without a count line the room is the size over the average line length.
-    std::string data;
-    for (int i = 0; i < 100; ++i) data += "1 2 3\n";
-    ZonCloudReadLeica estimated(Write("e.asc_rgb", data));
+    ZonCloudReadLeica estimated(Write("e.asc_rgb", Repeat("1 2 3\n", 100)));
     EXPECT_EQ(estimated.GetNumberOfPoints(), 100);
     EXPECT_EQ(estimated.GetCapacity(), 100u);
+
+    // Colours follow the sampled points; every point line counts.
+    ZonCloudReadLeica sampled(Write("s.asc_rgb", Repeat("1 2 3 4 5 6\n", 10)));
+    sampled.SetSamplingPercent(50.0f);
+    EXPECT_EQ(Colors(sampled).size(), 15u);
+    EXPECT_EQ(sampled.GetNumberOfPoints(), 10);
 }
 
-TEST_F(RgbPoints, EndCloudLineStopsTheReading)
-{
-    ZonCloudReadLeica reader(Write("p.asc_rgb", "1 2 3\n**end cloud**\n4 5 6\n"));
-    EXPECT_EQ(Points(reader), (std::vector<double>{1, 2, 3}));
-}
-
-TEST_F(RgbPoints, DecimalCommaFilesAreReadAfterTwoHundredUnknownLines)
+TEST_F(RgbPoints, DecimalSwapComesWithTheTwoHundredAndFirstUnknownLine)
 {
     // Under the "C" locale a comma stops a number: every line is unknown,
     // and the 201st makes the reader start again with ',' as decimal point.
-    std::string comma;
-    for (int i = 0; i < 201; ++i) comma += std::to_string(i) + ",5 2,25 3,125 10 20 30\n";
-    ZonCloudReadLeica reader(Write("comma.asc_rgb", comma));
-    const std::vector<double> points = Points(reader);
-    ASSERT_EQ(points.size(), 603u);
-    EXPECT_EQ(points[3], 1.5);
-    EXPECT_EQ(points[5], 3.125);
-    EXPECT_TRUE(reader.IsDecimalPointSwapped());
-    EXPECT_EQ(Colors(reader)[5], 30);
-
-    std::string shorter;
-    for (int i = 0; i < 200; ++i) shorter += "1,5 2,5 3,5\n";
-    ZonCloudReadLeica few(Write("few.asc_rgb", shorter));
-    EXPECT_EQ(ErrorKey([&] { Points(few); }), "ZonCloudReadNLSTool.ERR_NoPointFound");
-
-    std::string junk;
-    for (int i = 0; i < 201; ++i) junk += "no point here\n";
-    ZonCloudReadLeica unknown(Write("junk.asc_rgb", junk + "1 2 3\n"));
-    EXPECT_EQ(ErrorKey([&] { Points(unknown); }), "ZonCloudReadNLSTool.ERR_TooManyUnknownData");
-
-    // A point between unknown lines starts their count again.
-    std::string mixed;
-    for (int i = 0; i < 150; ++i) mixed += "x\n";
-    mixed += "1 2 3\n";
-    for (int i = 0; i < 150; ++i) mixed += "x\n";
-    ZonCloudReadLeica reset(Write("mixed.asc_rgb", mixed));
-    EXPECT_EQ(Points(reset), (std::vector<double>{1, 2, 3}));
-    EXPECT_FALSE(reset.IsDecimalPointSwapped());
+    const struct {
+        std::string data, key;
+        bool swapped;
+        std::size_t values;
+        Doubles second;  // the second point
+    } cases[] = {
+        // (a first line "1,5 ..." would be a count line, not an unknown one)
+        {Repeat("0,5 2,25 3,125 10 20 30\n", 201), "", true, 603, {0.5, 2.25, 3.125}},
+        {Repeat("0,5 2,5 3,5\n", 200), "ZonCloudReadNLSTool.ERR_NoPointFound", false, 0, {}},  // one short
+        {Repeat("no point here\n", 201) + "1 2 3\n", "ZonCloudReadNLSTool.ERR_TooManyUnknownData", true, 0, {}},
+        {Repeat("x\n", 150) + "1 2 3\n" + Repeat("x\n", 150) + "4 5 6\n", "", false, 6, {4, 5, 6}},  // a point starts the count again
+    };
+    for (const auto& c : cases) {
+        ZonCloudReadLeica reader(Write("p.asc_rgb", c.data));
+        Doubles points;
+        EXPECT_EQ(ErrorKey([&] { points = PointsOf(reader); }), c.key);
+        EXPECT_EQ(reader.IsDecimalPointSwapped(), c.swapped);
+        ASSERT_EQ(points.size(), c.values);
+        EXPECT_EQ(points.empty() ? Doubles{} : Doubles(points.begin() + 3, points.begin() + 6), c.second);
+    }
 }
 
-TEST_F(RgbPoints, SamplingAndSinglePrecision)
+TEST_F(RgbPoints, WriterBytesRoundTripAndToolConversion)
 {
-    std::string data;
-    for (int i = 0; i < 10; ++i) data += std::to_string(i) + ".1 0 0 1 2 3\n";
-    ZonCloudReadLeica reader(Write("p.asc_rgb", data));
-    reader.SetSamplingPercent(50.0f);
-    unsigned n = 0;
-    const float* p = reader.GetPoints(n);
-    ASSERT_EQ(n, 5u);
-    EXPECT_EQ(p[3], 2.1f);
-    EXPECT_EQ(reader.GetNumberOfPoints(), 10);
-    EXPECT_EQ(Colors(reader).size(), 15u);
-}
-
-TEST_F(RgbPoints, WriterBytesAndRoundTrip)
-{
-    const std::string path = (dir_ / "out.asc_rgb").string();
-    ZonCloudWriteLeica writer(path);
+    ZonCloudWriteLeica writer(Path("out.asc_rgb"));
     writer.BeginWritePoints(2);
     const double a[3] = {1.5, -2, 0.125};
     const unsigned char rgb[3] = {10, 0, 255};
@@ -203,29 +120,20 @@ TEST_F(RgbPoints, WriterBytesAndRoundTrip)
     writer.WritePoint(b);
     EXPECT_EQ(ErrorKey([&] { writer.WritePoint(b); }), "ZonCloudReadNLSTool.ERR_Failure");
     writer.EndWritePoints();
-    EXPECT_EQ(Read(path), "2\n1.500000 -2.000000 0.125000 10 0 255\n4.000000 5.000000 6.000000 255 255 255\n");
-
-    ZonCloudReadLeica reader(path);
-    EXPECT_EQ(Points(reader), (std::vector<double>{1.5, -2, 0.125, 4, 5, 6}));
-    EXPECT_EQ(Colors(reader), (std::vector<int>{10, 0, 255, 255, 255, 255}));
-    EXPECT_EQ(reader.GetCapacity(), 2u);
-
+    EXPECT_EQ(Slurp(Path("out.asc_rgb")), "2\n1.500000 -2.000000 0.125000 10 0 255\n4.000000 5.000000 6.000000 255 255 255\n");
+    ZonCloudReadLeica reader(Path("out.asc_rgb"));
+    EXPECT_EQ(PointsOf(reader), (Doubles{1.5, -2, 0.125, 4, 5, 6}));
+    EXPECT_EQ(Colors(reader), (Ints{10, 0, 255, 255, 255, 255}));
     writer.BeginWritePoints(3);
     writer.WritePoint(b);
     EXPECT_EQ(ErrorKey([&] { writer.EndWritePoints(); }), "ZonCloudReadNLSTool.ERR_Failure");
-}
 
-TEST_F(RgbPoints, ToolConvertsToRgbAndCgoFiles)
-{
+    // The tool picks the writer by the output's extension.
     const std::string in = Write("in.xyz_rgb", "1 2 3 10 20 30\n4 5 6\n");
-    const std::string rgb = (dir_ / "out.asc_rgb").string();
-    const std::string cgo = (dir_ / "out.cgo").string();
-    for (const std::string& out : {rgb, cgo}) {
-        const std::string command = std::string("'") + ZON_TOOL_PATH + "' convert '" + in + "' '" + out + "' >/dev/null 2>&1";
-        ASSERT_EQ(std::system(command.c_str()), 0) << out;
-    }
-    EXPECT_EQ(Read(rgb), "2\n1.000000 2.000000 3.000000 10 20 30\n4.000000 5.000000 6.000000 255 255 255\n");
-    EXPECT_EQ(Read(cgo), "2\n1.000000 2.000000 3.000000\n4.000000 5.000000 6.000000\n**end cloud**\n");
+    for (const char* out : {"tool.asc_rgb", "tool.cgo"})
+        ASSERT_EQ(Run("convert " + zontest::Quote(in) + " " + zontest::Quote(Path(out))).status, 0) << out;
+    EXPECT_EQ(Slurp(Path("tool.asc_rgb")), "2\n1.000000 2.000000 3.000000 10 20 30\n4.000000 5.000000 6.000000 255 255 255\n");
+    EXPECT_EQ(Slurp(Path("tool.cgo")), "2\n1.000000 2.000000 3.000000\n4.000000 5.000000 6.000000\n**end cloud**\n");
 }
 
 TEST_F(RgbPoints, OutputDocumentPlacesScalesAndColoursThePoints)
@@ -243,12 +151,11 @@ TEST_F(RgbPoints, OutputDocumentPlacesScalesAndColoursThePoints)
     single->SetSingleColor(7, 8, 9);
     auto scan = std::make_shared<ZonExchMemoryTessNode>(ZonExchNodeScan);
     scan->AddFace(single);
-    auto plain = std::make_shared<ZonExchMemoryTessFace>();
+    auto plain = std::make_shared<ZonExchMemoryTessFace>();  // no colour
     plain->SetCoords({0.5f, 0, 0});
-    auto grid = std::make_shared<ZonExchMemoryTessNode>(ZonExchNodeGrid);
-    grid->AddFace(plain);
+    scan->AddFace(plain);
     auto rep = std::make_shared<ZonExchMemoryTessRep>();
-    for (const auto& node : {cloud, scan, grid}) rep->AddTopNode(node);
+    for (const auto& node : {cloud, scan}) rep->AddTopNode(node);
     auto part = std::make_shared<ZonExchMemoryProduct>();
     part->SetTessellatedRep(rep);
     auto root = std::make_shared<ZonExchMemoryProduct>();
@@ -264,15 +171,14 @@ TEST_F(RgbPoints, OutputDocumentPlacesScalesAndColoursThePoints)
     const auto output = ZonQueryInterface<ZonIExchOutputDocument>(
         ZonObjectRegistry::CreateByLateType("CLD_AsciiRGB_OutputDocument"));
     ASSERT_NE(output, nullptr);
-    const std::string path = (dir_ / "doc.asc_rgb").string();
-    EXPECT_EQ(output->Open(), ZON_E_FAIL);  // no file name yet
-    EXPECT_EQ(output->SetFileName(path), ZON_S_OK);
+    EXPECT_EQ(output->SetFileName(Path("doc.asc_rgb")), ZON_S_OK);
     EXPECT_EQ(output->SetOptions({"Scaling"}, {}), ZON_E_FAIL);
     EXPECT_EQ(output->SetOptions({"Scaling", "Precision"}, {"2", "precUnknown"}), ZON_S_OK);
     EXPECT_EQ(output->Open(), ZON_S_OK);
     EXPECT_EQ(output->Write(document), ZON_S_OK);
     EXPECT_EQ(output->Release(), ZON_S_OK);
-    EXPECT_EQ(Read(path),
+    ZonSession::GetPtrSession()->SetReporter(std::make_shared<ZonStderrReporter>());
+    EXPECT_EQ(Slurp(Path("doc.asc_rgb")),
               "-4.000000 4.000000 26.000000 10 20 30 \n"
               "-10.000000 10.000000 32.000000 40 50 60 \n"
               "0.000000 0.000000 22.000000 7 8 9 \n"
@@ -281,9 +187,8 @@ TEST_F(RgbPoints, OutputDocumentPlacesScalesAndColoursThePoints)
     EXPECT_EQ(reporter->Entries()[0].key, "ZonCldExportCmd.ERR_FILESUCCESSFULL");
 
     // The file reads back: six values give the colour, three give white.
-    ZonCloudReadLeica reader(path);
-    EXPECT_EQ(Colors(reader), (std::vector<int>{10, 20, 30, 40, 50, 60, 7, 8, 9, 255, 255, 255}));
-    ZonSession::GetPtrSession()->SetReporter(std::make_shared<ZonStderrReporter>());
+    ZonCloudReadLeica reader(Path("doc.asc_rgb"));
+    EXPECT_EQ(Colors(reader), (Ints{10, 20, 30, 40, 50, 60, 7, 8, 9, 255, 255, 255}));
 }
 
 }  // namespace
