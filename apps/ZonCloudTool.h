@@ -1,5 +1,6 @@
 #pragma once
 #include <array>
+#include <memory>
 #include <optional>
 #include <string>
 #include <vector>
@@ -9,6 +10,9 @@
 
 #include "ZonError.h"
 #include "ZonICloudReadFile.h"
+
+class ZonCldBody;
+class ZonGeoFactoryProtected;
 
 // Reader options shared by the commands that read a file. Format options reach
 // the readers through the settings store, as in the interactive import.
@@ -34,6 +38,9 @@ struct ZonToolReaderOptions {
     std::string FormatName() const;
     // Creates the reader: by --format when given, else by the file's extension.
     ZonICloudReadFile_var CreateReader(std::string& formatName) const;
+    // Imports the file through the import entry, as the host would (by --format
+    // when given); the statistics text is the last message.
+    std::shared_ptr<ZonCldBody> Import(ZonGeoFactoryProtected& geometry, std::vector<ZonString>& messages) const;
 };
 
 // Writes numbers so that they read back to the same float or double.

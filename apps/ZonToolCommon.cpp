@@ -1,6 +1,7 @@
 #include <charconv>
 #include <cmath>
 
+#include "ZonCldBody.h"
 #include "ZonCldImportServices.h"
 #include "ZonCldImporter.h"
 #include "ZonCldSettings.h"
@@ -97,4 +98,17 @@ nlohmann::json ZonToolErrorJson(const ZonError& error)
             {"key", error.GetMessageKey()},
             {"severity", error.GetSeverity()},
             {"message", error.GetNLSMessage()}};
+}
+
+std::shared_ptr<ZonCldBody> ZonToolReaderOptions::Import(ZonGeoFactoryProtected& geometry,
+                                                         std::vector<ZonString>& messages) const
+{
+    const ZonMathTransformation placement;
+    ZonMathTransformation inverse;
+    ZonMathBox importBox = HasBox() ? Box() : ZonMathBox();
+    const ZonUnicodeString fileName(file);
+    if (format.empty())
+        return ZonCldImportServices::BuildCldBodyFromFile(geometry, fileName, placement, inverse, importBox, messages);
+    return ZonCldImportServices::BuildCldBodyWithFormat(geometry, ZonUnicodeString(format), fileName, placement,
+                                                        inverse, importBox, messages);
 }

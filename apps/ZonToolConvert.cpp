@@ -268,16 +268,8 @@ ZonToolRun ZonToolAddConvert(CLI::App& app)
         if (!target) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Input, "ERR_UnknownExtension");
 
         ZonGeoFactoryProtected geometry;
-        const ZonMathTransformation placement;
-        ZonMathTransformation inverse;
-        ZonMathBox box = options->HasBox() ? options->Box() : ZonMathBox();
         std::vector<ZonString> messages;
-        const ZonUnicodeString file(options->file);
-        const std::shared_ptr<ZonCldBody> body =
-            options->format.empty()
-                ? ZonCldImportServices::BuildCldBodyFromFile(geometry, file, placement, inverse, box, messages)
-                : ZonCldImportServices::BuildCldBodyWithFormat(geometry, ZonUnicodeString(options->format), file,
-                                                               placement, inverse, box, messages);
+        const std::shared_ptr<ZonCldBody> body = options->Import(geometry, messages);
         if (!body) return NothingWritten(convert->output);
         // The document's name in the output is the input's file name without its extension.
         const std::string alias = std::filesystem::path(options->file).stem().string();

@@ -39,16 +39,8 @@ ZonToolRun ZonToolAddInfo(CLI::App& app)
     return [options, json]() -> int {
         options->ApplyToSettings();
         ZonGeoFactoryProtected geometry;
-        const ZonMathTransformation placement;
-        ZonMathTransformation inverse;
-        ZonMathBox box = options->HasBox() ? options->Box() : ZonMathBox();
         std::vector<ZonString> messages;
-        const ZonUnicodeString file(options->file);
-        const std::shared_ptr<ZonCldBody> body =
-            options->format.empty()
-                ? ZonCldImportServices::BuildCldBodyFromFile(geometry, file, placement, inverse, box, messages)
-                : ZonCldImportServices::BuildCldBodyWithFormat(geometry, ZonUnicodeString(options->format), file,
-                                                               placement, inverse, box, messages);
+        const std::shared_ptr<ZonCldBody> body = options->Import(geometry, messages);
         // The statistics text comes last; anything before it is a note of the import.
         const std::string statistics = messages.empty() ? std::string() : messages.back();
         if (!messages.empty()) messages.pop_back();
@@ -63,7 +55,7 @@ ZonToolRun ZonToolAddInfo(CLI::App& app)
             {"grids", body->GetNumberOfGrids()},
             {"polygons", body->GetPolygons().size()},
             {"triangles", body->GetNumberOfTriangles()},
-            {"bbox", BoxJson(box)},
+            {"bbox", BoxJson(body->GetBox())},
             {"unit", body->GetUnitName()},
             {"messages", messages},
             {"statistics", statistics},
