@@ -83,12 +83,12 @@ protected:
         return {Floats(v, v + 3 * nv), Indices(t, t + 3 * nt)};
     }
 
-    // The catalog key of the error the reader raises when read, and checks that the file was closed.
+    // "key/severity" of the error the reader raises when read, and checks that the file was closed.
     std::string ErrorOf(const std::string& bytes)
     {
         const long before = OpenDescriptors();
         auto reader = Reader(bytes);
-        const std::string key = zontest::ErrorKey([&] { Read(*reader); });
+        const std::string key = zontest::ErrorKeyAndSeverity([&] { Read(*reader); });
         EXPECT_EQ(OpenDescriptors(), before) << "stream left open on " << key;
         return key;
     }
@@ -144,7 +144,7 @@ TEST_F(StlReaderTest, BinaryProtocolAndByteOrderOption)
 {
     auto reader = Reader(Binary(Grid(2)));
     EXPECT_THROW(reader->NextPolygon(), ZonError);  // before BeginGetPolygon
-    EXPECT_THROW(reader->SetBinaryFrom(3), ZonError);
+    EXPECT_EQ(zontest::ErrorKeyAndSeverity([&] { reader->SetBinaryFrom(3); }), "ZonCloudReadNLSTool.ERR_Failure/2");
     EXPECT_EQ(reader->GetTypeOfDigitization(), DigitizationPolygons);
     EXPECT_EQ(reader->GetNumberOfTriangles(), 2u);
     ZonMathBox box;
@@ -213,18 +213,19 @@ TEST_F(StlReaderTest, BrokenFilesRaiseTheirErrorWithTheStreamClosed)
         std::string bytes;
         const char* key;
     } cases[] = {
-        {"empty file", "", "ZonCloudOperErrorTool.ERR_ENODATA"},
-        {"no count word", good.substr(0, 82), "ZonCloudOperErrorTool.ERR_ENODATA"},
-        {"no whole record", good.substr(0, 84 + 47), "ZonCloudReadNLSTool.ERR_NoPointFound"},
-        {"record cut in its floats", one.substr(0, one.size() - 3), "ZonCloudReadNLSTool.ERR_NoPointFound"},
-        {"count 0", Binary(Grid(3), 0), "ZonCloudReadNLSTool.ERR_NoPointFound"},
-        {"all vertices equal", Binary(flat), "ZonCloudReadNLSTool.ERR_UnknownData"},
-        {"absurd box", Binary(huge), "ZonCloudReadNLSTool.ERR_UnknownData"},
-        {"vertex at line 101", late + facet, "ZonCloudReadNLSTool.ERR_UnknownData"},
+        // Severity 4: content errors and failed opens; 2: input errors, the implausible binary data too.
+        {"empty file", "", "ZonCloudOperErrorTool.ERR_ENODATA/4"},
+        {"no count word", good.substr(0, 82), "ZonCloudOperErrorTool.ERR_ENODATA/2"},
+        {"no whole record", good.substr(0, 84 + 47), "ZonCloudReadNLSTool.ERR_NoPointFound/4"},
+        {"record cut in its floats", one.substr(0, one.size() - 3), "ZonCloudReadNLSTool.ERR_NoPointFound/4"},
+        {"count 0", Binary(Grid(3), 0), "ZonCloudReadNLSTool.ERR_NoPointFound/4"},
+        {"all vertices equal", Binary(flat), "ZonCloudReadNLSTool.ERR_UnknownData/2"},
+        {"absurd box", Binary(huge), "ZonCloudReadNLSTool.ERR_UnknownData/2"},
+        {"vertex at line 101", late + facet, "ZonCloudReadNLSTool.ERR_UnknownData/2"},
         {"four garbage vertex lines in a row", "solid\n" + facet + "vertex a\nvertex b\nvertex c\nvertex d\n" + facet,
-         "ZonCloudReadNLSTool.ERR_TooManyUnknownData"},
-        {"only garbage", "solid\nvertex x y z\nendsolid\n", "ZonCloudReadNLSTool.ERR_NoPointFound"},
-        {"two vertices, no triangle", "solid\nvertex 0 0 0\nvertex 1 1 1\n", "ZonCloudReadNLSTool.ERR_NoPointFound"},
+         "ZonCloudReadNLSTool.ERR_TooManyUnknownData/4"},
+        {"only garbage", "solid\nvertex x y z\nendsolid\n", "ZonCloudReadNLSTool.ERR_NoPointFound/4"},
+        {"two vertices, no triangle", "solid\nvertex 0 0 0\nvertex 1 1 1\n", "ZonCloudReadNLSTool.ERR_NoPointFound/4"},
     };
     for (const auto& c : cases) EXPECT_EQ(ErrorOf(c.bytes), c.key) << c.what;
 }

@@ -37,7 +37,7 @@ using Tool = ZonCloudReadNLSTool;
 {
     ZonCloudOperError error(ZonCloudOperErrorTool::InsufficientMemoryKey, ZonCloudOperErrorTool::Catalog);
     error.SetSeverity(4);
-    error.SetSource(__FILE__, __LINE__);
+    error.SetSource("ZonCloudReadStl", __LINE__);
     throw error;
 }
 
@@ -415,7 +415,7 @@ void ZonCloudReadStl::AnalyseBinary()
     const CountChoice choice = ChooseCount(stored, reversed, fits);
     _byteOrder = choice.native ? Current : Differ;
     _nativeOrder = choice.native;
-    if (choice.count < 0) Tool::Raise(Tool::Data, "ERR_UnknownData");
+    if (choice.count < 0) Tool::Raise(Tool::Input, "ERR_UnknownData");
 
     // The count word is only a bound: what counts is what the file holds.
     std::vector<unsigned char> buffer(RecordBlockSize(_file));
@@ -449,7 +449,7 @@ void ZonCloudReadStl::AnalyseBinary()
                               double(box.high[2]) - box.low[2]};
     const bool plausible = !box.IsEmpty() && extent[0] + extent[1] + extent[2] > 1e-6 &&
                            extent[0] * extent[1] * extent[2] < 3.4028234663852886e+38;
-    if (!plausible) Tool::Raise(Tool::Data, "ERR_UnknownData");
+    if (!plausible) Tool::Raise(Tool::Input, "ERR_UnknownData");
     _boundingBox = box.Box();
 }
 
@@ -476,7 +476,7 @@ unsigned ZonCloudReadStl::GetNumberOfTriangles()
 
 void ZonCloudReadStl::SetBinaryFrom(int from)
 {
-    if (from < Unknown || from > Differ) Tool::Raise(Tool::Usage, "ERR_Failure");
+    if (from < Unknown || from > Differ) Tool::Raise(Tool::Input, "ERR_Failure");
     if (from == _byteOrder) return;
     _byteOrder = from;
     _nativeOrder = from != Differ;
