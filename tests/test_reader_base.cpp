@@ -1,6 +1,7 @@
 // The reader base: sampling rule, box clipping and its caches, protocol defaults.
 #include <gtest/gtest.h>
 
+#include <limits>
 #include <vector>
 
 #include "ZonCloudReadFile.h"
@@ -130,6 +131,8 @@ TEST(ReaderBase, SamplingPercentRangeAndCacheSurvival)
     MemoryReader reader(Lattice(), 1);
     EXPECT_EQ(KeyOf([&] { reader.SetSamplingPercent(-0.001f); }), "ZonCloudReadNLSTool.ERR_InvalidPercentValue/1");
     EXPECT_EQ(KeyOf([&] { reader.SetSamplingPercent(100.001f); }), "ZonCloudReadNLSTool.ERR_InvalidPercentValue/1");
+    EXPECT_EQ(KeyOf([&] { reader.SetSamplingPercent(std::numeric_limits<float>::quiet_NaN()); }),
+              "ZonCloudReadNLSTool.ERR_InvalidPercentValue/1");
     EXPECT_EQ(KeyOf([&] { reader.SetSamplingPercent(0.0f); }), "none");
     EXPECT_EQ(KeyOf([&] { reader.SetSamplingPercent(100.0f); }), "none");
 
@@ -194,6 +197,18 @@ TEST(ReaderBase, BoxCacheIsReusedForTheSameBoxAndDroppedForAnother)
     reader.GetPointsInBox(b, n3);
     EXPECT_EQ(n3, 18u);
     for (unsigned i = 0; i < n3; ++i) EXPECT_GE(reader.GetPointsInBox(b, n3)[3 * i], 1.0f);
+    // The precisions share the cached box: each answers for the box it was asked.
+    reader.GetPointsInBox(a, n1);
+    const double* d = reader.GetPointsInBoxDouble(b, n3);
+    ASSERT_EQ(n3, 18u);
+    for (unsigned i = 0; i < n3; ++i) EXPECT_GE(d[3 * i], 1.0);
+    const float* f = reader.GetPointsInBox(b, n2);
+    ASSERT_EQ(n2, 18u);
+    for (unsigned i = 0; i < n2; ++i) EXPECT_GE(f[3 * i], 1.0f);
+    MemoryReader other(Lattice(), 1);
+    other.GetPointsInBox(a, n1);
+    EXPECT_EQ(other.GetPointsInBoxDouble(ZonMathBox(5, 6, 5, 6, 5, 6), n3), nullptr);
+    EXPECT_EQ(n3, 0u);
 }
 
 TEST(ReaderBase, ScanBoxQuery)

@@ -2,6 +2,7 @@
 
 #include <cerrno>
 #include <new>
+#include <type_traits>
 
 #include <sys/stat.h>
 
@@ -16,7 +17,8 @@ void ZonCloudReadFile::GetFileName(ZonUnicodeString& name) { name = _fileName; }
 
 void ZonCloudReadFile::SetSamplingPercent(float percent)
 {
-    if (percent < 0.0f || percent > 100.0f)
+    // Written so that NaN is refused too: it would make every sampling decision undefined.
+    if (!(percent >= 0.0f && percent <= 100.0f))
         ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Usage, "ERR_InvalidPercentValue");
     if (percent == _samplingPercent) return;
     _samplingPercent = percent;
@@ -159,8 +161,21 @@ const T* ZonCloudReadFile::PointsInBox(const ZonMathBox& box, unsigned& count, c
         }
         ClearBoxCaches();
     }
+    // Both precisions share the cached box and count. Without a cache of this
+    // precision they describe the other one's result, which must neither give
+    // this query its count nor pass later for this query's box: drop it.
+    if constexpr (std::is_same_v<T, float>) {
+        std::vector<double>().swap(_cachedPointsDouble);
+        _hasCachedPointsDouble = false;
+    } else {
+        std::vector<float>().swap(_cachedPoints);
+        _hasCachedPoints = false;
+    }
+    _cachedBox.SetToEmpty();
+    _cachedBoxEmpty = true;
+    _cachedCount = 0;
     count = _cachedCount;
-    if (!points || n == 0 || !box.Intersects(fileBox, 0.0)) return hasCache ? cache.data() : nullptr;
+    if (!points || n == 0 || !box.Intersects(fileBox, 0.0)) return nullptr;
 
     _cachedBox = box;
     _cachedBoxEmpty = false;
