@@ -186,6 +186,8 @@ TEST_F(AsciiLibreTest, DelimitersCutTheFileIntoScans)
         {"end lines only", "", "E", "1 1 1\n2 2 2\nE\n3 3 3\nE\n", 3, {2, 1, 0}},
         // Lines between an end and the next begin are skipped.
         {"points between scans", "B", "E", "B\n1 1 1\n1 1 1\nE\n9 9 9\nB\n2 2 2\n2 2 2\nE\n", 5, {2, 2}},
+        // With an end text, only an end line closes a scan: a stray begin line does not.
+        {"begin line inside a scan", "B", "E", "B\n1 1 1\n1 1 1\nB\n2 2 2\nE\nB\n3 3 3\nE\n", 4, {3, 1}},
     };
     for (const auto& c : cases) {
         SCOPED_TRACE(c.name);

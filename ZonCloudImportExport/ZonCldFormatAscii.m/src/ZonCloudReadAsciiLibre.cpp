@@ -548,9 +548,11 @@ bool ZonCloudReadAsciiLibre::NextScan()
             } else if (StartsWithDelimiter(first, last, _endDelimiter)) {
                 complete = endIsBegin;
                 open = false;
-            } else if (StartsWithDelimiter(first, last, _beginDelimiter) && !_scanPointsDouble.empty()) {
-                // A begin line inside a scan that has points starts the next
-                // one, so files without end lines still come in scans.
+            } else if (_endDelimiter.empty() && StartsWithDelimiter(first, last, _beginDelimiter) &&
+                       !_scanPointsDouble.empty()) {
+                // Without an end text nothing else could close a scan, so a
+                // begin line after points starts the next one. With an end
+                // text, only the end line closes the scan.
                 complete = true;
             }
         } else if (StartsWithDelimiter(first, last, _beginDelimiter)) {
