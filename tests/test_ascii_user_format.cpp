@@ -221,6 +221,7 @@ TEST_F(AsciiUserFormat, WriterLinesForEachShape)
         {{"only", "three", "texts"}, false, "       1.000       2.000       3.000\r\n"},  // ignored: the defaults
         {{"N", "N", "N", "N", "N", "6", "1"}, true, "   1.0   2.0   3.0    10   200     0\r\n"},
         {{"N", "N", "N", "N", "Y", "6", "2"}, false, "    1  1.00  2.00  3.00\r\n"},
+        {{"N", "N", "N", "N", "N", "-4", "1"}, false, " 1.0   2.0   3.0  \r\n"},  // a negative width left-aligns
         {{"N", "N", "N", ";", "N", "7", "2"}, false, "  1.00 ;  2.00 ;  3.00\r\n"},
         {{"N", "N", "N", "%", "Y", "5", "0"}, true, "   1 %   1 %   2 %   3 %  10 % 200 %   0\r\n"},
         {{"Head", "Cloud 1", "=", "N", "N", "2", "0"}, false,
