@@ -9,7 +9,6 @@
 namespace {
 
 constexpr int MaxWidth = 1000;    // keeps a row separator line (4 W long) reasonable
-// A negative width is a printf width too: it left-aligns the columns.
 constexpr int MaxDecimals = 100;  // beyond this printf has nothing left to show
 
 // Reads an integer setting; the old value stays when the text is not one.
@@ -52,6 +51,7 @@ void ZonCloudWriteAsciiUserFormat::SetWriteSettings(const ZonListValZonString& s
     text(settings[2], _rowSeparator, _rowSeparatorGiven);
     text(settings[3], _columnSeparator, _columnSeparatorGiven);
     _pointNumber = settings[4] == "Y";
+    // A negative width is a printf width too: it left-aligns the columns.
     ParseInteger(settings[5], _width, -MaxWidth, MaxWidth);
     ParseInteger(settings[6], _decimals, 0, MaxDecimals);
 }
