@@ -114,6 +114,8 @@ TEST(Sampling, KeepsByWholePartOfIndexTimesRate)
     ZonCloudSampler sampler(50.0f);
     EXPECT_EQ(sampler.CountKept(10), 5u);
     EXPECT_EQ(sampler.CountKept(11), 6u);
+    // 100 % keeps every point, also past the runs a float index can count exactly.
+    EXPECT_EQ(ZonCloudSampler(100.0f).CountKept((1u << 24) + 10), (1u << 24) + 10);
 }
 
 TEST(Sampling, RestartKeepsTheFirstPointOfEachRun)

@@ -20,6 +20,12 @@ public:
     // Decides for the next point of the run.
     bool Keep()
     {
+        // Past 2^24 points a float index repeats, which would drop points even
+        // at 100 %; at that rate every whole part differs, so keep each point.
+        if (step_ >= 1.0f) {
+            ++index_;
+            return true;
+        }
         const auto whole = static_cast<std::int64_t>(static_cast<float>(index_) * step_);
         ++index_;
         if (whole == previous_) return false;
