@@ -4,6 +4,7 @@
 
 #include "ZonHostExport.h"
 #include "ZonIExchTessFace.h"
+#include "ZonMath.h"
 #include "ZonUnicodeString.h"
 
 // Kinds of tessellated nodes.
@@ -32,6 +33,8 @@ public:
     virtual ZonUnicodeString GetName() = 0;
     // Row-major 3 x 3 matrix and translation: p' = M p + t.
     virtual void GetPosition(std::array<float, 9>& matrix, std::array<float, 3>& translation) = 0;
+    // The same placement widened to double precision.
+    ZonMathTransformation GetPositionTransformation();
     virtual unsigned GetNumberOfChildren() = 0;
     virtual ZonIExchTessNode_var GetChild(unsigned child) = 0;
     virtual unsigned GetNumberOfFaces() = 0;

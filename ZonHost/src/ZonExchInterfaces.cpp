@@ -11,6 +11,16 @@
 
 ZonIExchTessFace::~ZonIExchTessFace() = default;
 ZonIExchTessNode::~ZonIExchTessNode() = default;
+
+ZonMathTransformation ZonIExchTessNode::GetPositionTransformation()
+{
+    std::array<float, 9> matrix{};
+    std::array<float, 3> translation{};
+    GetPosition(matrix, translation);
+    std::array<double, 9> m{};
+    for (int i = 0; i < 9; ++i) m[i] = matrix[i];
+    return ZonMathTransformation(m, {translation[0], translation[1], translation[2]});
+}
 ZonIExchTessRep::~ZonIExchTessRep() = default;
 ZonIExchProduct::~ZonIExchProduct() = default;
 ZonIExchInstance::~ZonIExchInstance() = default;

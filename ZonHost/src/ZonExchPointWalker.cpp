@@ -13,16 +13,6 @@ namespace {
 // Nesting deeper than this (or a product that holds itself) is not followed.
 constexpr int MaxDepth = 256;
 
-ZonMathTransformation NodePosition(ZonIExchTessNode& node)
-{
-    std::array<float, 9> matrix{};
-    std::array<float, 3> translation{};
-    node.GetPosition(matrix, translation);
-    std::array<double, 9> m{};
-    for (int i = 0; i < 9; ++i) m[i] = matrix[i];
-    return ZonMathTransformation(m, {translation[0], translation[1], translation[2]});
-}
-
 class Walker {
 public:
     Walker(bool readDouble, const ZonExchPointWalker::Visit& visit) : _readDouble(readDouble), _visit(visit) {}
@@ -51,7 +41,7 @@ private:
     void Node(ZonIExchTessNode& node, const ZonMathTransformation& parent, bool doubles, int depth)
     {
         if (depth > MaxDepth) return;
-        const ZonMathTransformation placement = parent * NodePosition(node);
+        const ZonMathTransformation placement = parent * node.GetPositionTransformation();
         for (unsigned i = 0; i < node.GetNumberOfFaces(); ++i)
             if (ZonIExchTessFace_var face = node.GetFace(i)) Face(*face, placement, doubles);
         for (unsigned i = 0; i < node.GetNumberOfChildren(); ++i)

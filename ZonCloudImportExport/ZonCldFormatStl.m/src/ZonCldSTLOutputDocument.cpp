@@ -20,16 +20,6 @@ const ZonRegistration MuxeRegistration("MUXE_STL_OutputDocument", ZonIExchOutput
 // nests deeper than this (or instantiates itself) is refused.
 constexpr int MaxDepth = 256;
 
-ZonMathTransformation NodePosition(ZonIExchTessNode& node)
-{
-    std::array<float, 9> matrix{};
-    std::array<float, 3> translation{};
-    node.GetPosition(matrix, translation);
-    std::array<double, 9> m{};
-    for (int i = 0; i < 9; ++i) m[i] = matrix[i];
-    return ZonMathTransformation(m, {translation[0], translation[1], translation[2]});
-}
-
 // The alias name is a format without arguments: "%%" gives one per cent
 // sign. Any other directive is written as it stands rather than reading an
 // argument that is not there.
@@ -147,7 +137,7 @@ void ZonCldSTLOutputDocument::WriteRepresentation(ZonIExchTessRep& rep, const Zo
 void ZonCldSTLOutputDocument::WriteTopNode(ZonIExchTessNode& node, const ZonMathTransformation& parent, int depth)
 {
     if (depth > MaxDepth) RaiseInput("ERR_Failure");
-    const ZonMathTransformation placement = parent * NodePosition(node);
+    const ZonMathTransformation placement = parent * node.GetPositionTransformation();
     switch (node.GetType()) {
         case ZonExchNodeGroup:
         case ZonExchNodeLayer:
@@ -162,7 +152,7 @@ void ZonCldSTLOutputDocument::WriteTopNode(ZonIExchTessNode& node, const ZonMath
             WriteNode(node, placement);
             for (unsigned i = 0; i < node.GetNumberOfChildren(); ++i) {
                 ZonIExchTessNode_var child = node.GetChild(i);
-                if (child) WriteNode(*child, placement * NodePosition(*child));
+                if (child) WriteNode(*child, placement * child->GetPositionTransformation());
             }
             break;
         default: WriteNode(node, placement); break;
