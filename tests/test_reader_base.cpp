@@ -8,72 +8,9 @@
 #include "ZonCloudReadNLSTool.h"
 #include "ZonCloudSampler.h"
 #include "ZonTieCloudReadFile.h"
+#include "MemoryReaders.h"
 
 namespace {
-
-// A reader over points held in memory, offering scans (one scan of all points)
-// or grids (one grid of all points, every third point a hole) as asked.
-class MemoryReader : public ZonCloudReadFile,
-                     public ZonTieCloudReadScanFile<MemoryReader>,
-                     public ZonTieCloudReadGridFile<MemoryReader> {
-public:
-    MemoryReader(std::vector<float> points, int type) : ZonCloudReadFile("memory"), points_(std::move(points)), type_(type)
-    {
-        for (double p : points_) doubles_.push_back(p);
-    }
-    int analyseCount = 0;
-
-    const float* GetPoints(unsigned& count) override
-    {
-        Analyse();
-        count = static_cast<unsigned>(points_.size() / 3);
-        return points_.data();
-    }
-    const double* GetPointsDouble(unsigned& count) override
-    {
-        Analyse();
-        count = static_cast<unsigned>(doubles_.size() / 3);
-        return doubles_.data();
-    }
-    bool NextScan() override { return scanPending_ ? !(scanPending_ = false) : false; }
-    void BeginGetScan() override { scanPending_ = true; }
-    const float* GetScanPoints(unsigned& count) override { return GetPoints(count); }
-    const double* GetScanPointsDouble(unsigned& count) override { return GetPointsDouble(count); }
-    void BeginGetGridPoints() override { gridRows_ = 0; }
-    const float* GetGridPoints(unsigned& count, const unsigned char*& valid) override
-    {
-        // First an empty row, then the whole grid, then the end.
-        const int row = gridRows_++;
-        valid = nullptr;
-        count = 0;
-        if (row == 0) return points_.data();
-        if (row > 1) return nullptr;
-        validity_.assign(points_.size() / 3, 1);
-        for (std::size_t i = 2; i < validity_.size(); i += 3) validity_[i] = 0;
-        valid = validity_.data();
-        count = static_cast<unsigned>(validity_.size());
-        return points_.data();
-    }
-
-protected:
-    void Analyse() override
-    {
-        if (_analysed) return;
-        ++analyseCount;
-        _analysed = true;
-        _digitizationType = type_;
-        _numberOfPoints = static_cast<int>(points_.size() / 3);
-        for (std::size_t i = 0; i < points_.size(); i += 3) _boundingBox.AddPoint(points_[i], points_[i + 1], points_[i + 2]);
-    }
-
-private:
-    std::vector<float> points_;
-    std::vector<double> doubles_;
-    std::vector<unsigned char> validity_;
-    int type_;
-    bool scanPending_ = false;
-    int gridRows_ = 0;
-};
 
 // Points on the integer lattice 0..2 on each axis: the box is [0,2]^3.
 std::vector<float> Lattice()
@@ -83,6 +20,26 @@ std::vector<float> Lattice()
         for (int y = 0; y <= 2; ++y)
             for (int z = 0; z <= 2; ++z) p.insert(p.end(), {float(x), float(y), float(z)});
     return p;
+}
+
+// The lattice as a cloud (1), as one scan (2) or as one grid (3) that starts with
+// an empty row and has every third point a hole.
+std::shared_ptr<MemoryReader> LatticeReader(int type)
+{
+    MemoryContent content;
+    content.type = type;
+    content.hasDouble = true;
+    if (type == 1) content.points = Lattice();
+    if (type == 2) content.sets = {{Lattice()}};
+    if (type == 3) {
+        MemoryContent::Row empty, full{Lattice(), std::vector<unsigned char>(27, 1)};
+        empty.points.reserve(3);  // an empty row that is not the end: a non-null array of no point
+        for (std::size_t i = 2; i < 27; i += 3) full.valid[i] = 0;
+        content.grids.push_back({});
+        content.grids[0].push_back(std::move(empty));
+        content.grids[0].push_back(std::move(full));
+    }
+    return std::make_shared<MemoryReader>("memory", std::move(content));
 }
 
 std::string KeyOf(const std::function<void()>& f)
@@ -130,35 +87,34 @@ TEST(Sampling, RestartKeepsTheFirstPointOfEachRun)
 
 TEST(ReaderBase, SamplingPercentRangeAndCacheSurvival)
 {
-    MemoryReader reader(Lattice(), 1);
-    EXPECT_EQ(KeyOf([&] { reader.SetSamplingPercent(-0.001f); }), "ZonCloudReadNLSTool.ERR_InvalidPercentValue/1");
-    EXPECT_EQ(KeyOf([&] { reader.SetSamplingPercent(100.001f); }), "ZonCloudReadNLSTool.ERR_InvalidPercentValue/1");
-    EXPECT_EQ(KeyOf([&] { reader.SetSamplingPercent(std::numeric_limits<float>::quiet_NaN()); }),
+    const auto reader = LatticeReader(1);
+    EXPECT_EQ(KeyOf([&] { reader->SetSamplingPercent(-0.001f); }), "ZonCloudReadNLSTool.ERR_InvalidPercentValue/1");
+    EXPECT_EQ(KeyOf([&] { reader->SetSamplingPercent(100.001f); }), "ZonCloudReadNLSTool.ERR_InvalidPercentValue/1");
+    EXPECT_EQ(KeyOf([&] { reader->SetSamplingPercent(std::numeric_limits<float>::quiet_NaN()); }),
               "ZonCloudReadNLSTool.ERR_InvalidPercentValue/1");
-    EXPECT_EQ(KeyOf([&] { reader.SetSamplingPercent(0.0f); }), "none");
-    EXPECT_EQ(KeyOf([&] { reader.SetSamplingPercent(100.0f); }), "none");
+    EXPECT_EQ(KeyOf([&] { reader->SetSamplingPercent(0.0f); }), "none");
+    EXPECT_EQ(KeyOf([&] { reader->SetSamplingPercent(100.0f); }), "none");
 
     const ZonMathBox box(0, 1, 0, 1, 0, 1);
     unsigned n = 0;
-    const float* first = reader.GetPointsInBox(box, n);
-    reader.SetSamplingPercent(100.0f);  // same value: the cache survives
+    const float* first = reader->GetPointsInBox(box, n);
+    reader->SetSamplingPercent(100.0f);  // same value: the cache survives
     unsigned m = 0;
-    EXPECT_EQ(reader.GetPointsInBox(box, m), first);
+    EXPECT_EQ(reader->GetPointsInBox(box, m), first);
     EXPECT_EQ(m, n);
-    reader.SetSamplingPercent(50.0f);  // a new value clears it
-    const float* again = reader.GetPointsInBox(box, m);
+    reader->SetSamplingPercent(50.0f);  // a new value clears it
+    const float* again = reader->GetPointsInBox(box, m);
     EXPECT_EQ(m, n);
     EXPECT_NE(again, nullptr);
 }
 
 TEST(ReaderBase, BoxQueryWithTheFileBoxReturnsTheReadersOwnArray)
 {
-    MemoryReader reader(Lattice(), 1);
+    const auto reader = LatticeReader(1);
     unsigned all = 0, n = 0;
-    const float* points = reader.GetPoints(all);
-    EXPECT_EQ(reader.GetPointsInBox(ZonMathBox(0, 2, 0, 2, 0, 2), n), points);
+    const float* points = reader->GetPoints(all);
+    EXPECT_EQ(reader->GetPointsInBox(ZonMathBox(0, 2, 0, 2, 0, 2), n), points);
     EXPECT_EQ(n, 27u);
-    EXPECT_EQ(reader.analyseCount, 1);
 }
 
 TEST(ReaderBase, BoxFacesAreHalfOpenExceptOnTheFilesHighFaces)
@@ -176,57 +132,59 @@ TEST(ReaderBase, BoxFacesAreHalfOpenExceptOnTheFilesHighFaces)
         {ZonMathBox(1, 1.5, 1, 1.5, 1, 1.5), 1},
     };
     for (const Case& c : cases) {
-        MemoryReader reader(Lattice(), 1);
+        const auto reader = LatticeReader(1);
         unsigned n = 99;
-        reader.GetPointsInBox(c.box, n);
+        reader->GetPointsInBox(c.box, n);
         EXPECT_EQ(n, c.expected);
         unsigned nd = 99;
-        reader.GetPointsInBoxDouble(c.box, nd);
+        reader->GetPointsInBoxDouble(c.box, nd);
         EXPECT_EQ(nd, c.expected);
     }
 }
 
 TEST(ReaderBase, BoxCacheIsReusedForTheSameBoxAndDroppedForAnother)
 {
-    MemoryReader reader(Lattice(), 1);
+    const auto reader = LatticeReader(1);
     const ZonMathBox a(0, 1, 0, 2, 0, 2), b(1, 2, 0, 2, 0, 2);
     unsigned n1 = 0, n2 = 0, n3 = 0;
-    const float* r1 = reader.GetPointsInBox(a, n1);
-    const float* r2 = reader.GetPointsInBox(a, n2);
+    const float* r1 = reader->GetPointsInBox(a, n1);
+    const float* r2 = reader->GetPointsInBox(a, n2);
     EXPECT_EQ(r1, r2);
     EXPECT_EQ(n1, n2);
     EXPECT_EQ(n1, 9u);
-    reader.GetPointsInBox(b, n3);
+    reader->GetPointsInBox(b, n3);
     EXPECT_EQ(n3, 18u);
-    for (unsigned i = 0; i < n3; ++i) EXPECT_GE(reader.GetPointsInBox(b, n3)[3 * i], 1.0f);
+    for (unsigned i = 0; i < n3; ++i) EXPECT_GE(reader->GetPointsInBox(b, n3)[3 * i], 1.0f);
     // The precisions share the cached box: each answers for the box it was asked.
-    reader.GetPointsInBox(a, n1);
-    const double* d = reader.GetPointsInBoxDouble(b, n3);
+    reader->GetPointsInBox(a, n1);
+    const double* d = reader->GetPointsInBoxDouble(b, n3);
     ASSERT_EQ(n3, 18u);
     for (unsigned i = 0; i < n3; ++i) EXPECT_GE(d[3 * i], 1.0);
-    const float* f = reader.GetPointsInBox(b, n2);
+    const float* f = reader->GetPointsInBox(b, n2);
     ASSERT_EQ(n2, 18u);
     for (unsigned i = 0; i < n2; ++i) EXPECT_GE(f[3 * i], 1.0f);
-    MemoryReader other(Lattice(), 1);
-    other.GetPointsInBox(a, n1);
-    EXPECT_EQ(other.GetPointsInBoxDouble(ZonMathBox(5, 6, 5, 6, 5, 6), n3), nullptr);
+    const auto other = LatticeReader(1);
+    other->GetPointsInBox(a, n1);
+    EXPECT_EQ(other->GetPointsInBoxDouble(ZonMathBox(5, 6, 5, 6, 5, 6), n3), nullptr);
     EXPECT_EQ(n3, 0u);
 }
 
 TEST(ReaderBase, ScanBoxQuery)
 {
     // Readers offering an interface are used through it or through the base.
-    MemoryReader cloudReader(Lattice(), 1);
-    ZonCloudReadFile& cloud = cloudReader;
+    const auto cloudReader = LatticeReader(1);
+    ZonCloudReadFile& cloud = *cloudReader;
     unsigned n = 0;
     EXPECT_EQ(KeyOf([&] { cloud.GetScanPointsInBox(ZonMathBox(0, 1, 0, 1, 0, 1), n); }),
               "ZonCloudReadNLSTool.ERR_NotAScanDigit/1");
-    // The base's scan protocol does nothing on a cloud reader.
+    // The base's scan protocol does nothing on a cloud reader->
     EXPECT_EQ(KeyOf([&] { cloud.BeginGetSetOfScans(); }), "none");
     EXPECT_FALSE(cloud.NextSetOfScans());
 
-    MemoryReader scanReader(Lattice(), 2);
-    ZonCloudReadFile& scans = scanReader;
+    const auto scanReader = LatticeReader(2);
+    ZonCloudReadFile& scans = *scanReader;
+    scans.BeginGetSetOfScans();
+    ASSERT_TRUE(scans.NextSetOfScans());
     scans.BeginGetScan();
     ASSERT_TRUE(scans.NextScan());
     EXPECT_EQ(scans.GetScanPointsInBox(ZonMathBox(5, 6, 5, 6, 5, 6), n), nullptr);
@@ -241,8 +199,10 @@ TEST(ReaderBase, ScanBoxQuery)
 
 TEST(ReaderBase, GridBoxQuerySkipsEmptyRowsAndOnlyChangesValidity)
 {
-    MemoryReader gridReader(Lattice(), 3);
-    ZonCloudReadFile& grid = gridReader;
+    const auto gridReader = LatticeReader(3);
+    ZonCloudReadFile& grid = *gridReader;
+    grid.BeginGetGrid();
+    ASSERT_TRUE(grid.NextGrid());
     grid.BeginGetGridPoints();
     unsigned n = 0;
     const unsigned char* valid = nullptr;
@@ -258,8 +218,8 @@ TEST(ReaderBase, GridBoxQuerySkipsEmptyRowsAndOnlyChangesValidity)
     EXPECT_EQ(n, 0u);
     EXPECT_EQ(valid, nullptr);
 
-    MemoryReader cloudReader(Lattice(), 1);
-    ZonCloudReadFile& cloud = cloudReader;
+    const auto cloudReader = LatticeReader(1);
+    ZonCloudReadFile& cloud = *cloudReader;
     EXPECT_EQ(KeyOf([&] { cloud.GetGridPointsInBox(ZonMathBox(0, 1, 0, 1, 0, 1), n, valid); }),
               "ZonCloudReadNLSTool.ERR_NotAGridDigit/1");
 }
@@ -280,13 +240,14 @@ TEST(ReaderBase, InterfacesAreOfferedOnlyByReadersThatDeriveFromThem)
     };
     ZonICloudReadFile_var cloud = std::make_shared<CloudOnly>();
     EXPECT_EQ(ZonQueryInterface<ZonICloudReadScanFile>(cloud), nullptr);
-    ZonICloudReadFile_var scans = std::make_shared<MemoryReader>(Lattice(), 2);
+    ZonICloudReadFile_var scans = LatticeReader(2);
     auto scanInterface = ZonQueryInterface<ZonICloudReadScanFile>(scans);
     ASSERT_NE(scanInterface, nullptr);
+    scanInterface->BeginGetSetOfScans();
+    ASSERT_TRUE(scanInterface->NextSetOfScans());
     scanInterface->BeginGetScan();
     EXPECT_TRUE(scanInterface->NextScan());
     EXPECT_FALSE(scanInterface->NextScan());
-    // Defaults of the base answer through the interface too.
     EXPECT_FALSE(scanInterface->NextSetOfScans());
     EXPECT_EQ(cloud->GetLengthUnit(), nullptr);
     EXPECT_FALSE(cloud->HasDoublePrecision());
