@@ -23,7 +23,7 @@ struct MemoryContent {
         std::vector<unsigned> triangles;
     };
 
-    int type = 1;
+    int type = DigitizationCloud;
     std::vector<float> points{};  // the cloud; for other types the structure's points
     bool hasDouble = false;       // double queries answer, with doubleOffset added to tell them apart
     double doubleOffset = 0.0;
@@ -72,14 +72,12 @@ public:
     ZonICkeUnit_var GetLengthUnit() override { return _content.unit; }
 
 protected:
-    void Analyse() override
+    void AnalyseFile() override
     {
-        if (_analysed) return;
-        if (_content.openFile) OpenFile();
+        if (_content.openFile) Source();
         _digitizationType = _content.type;
         _numberOfPoints = static_cast<int>(_all.size() / 3);
         for (std::size_t i = 0; i < _all.size(); i += 3) _boundingBox.AddPoint(_all[i], _all[i + 1], _all[i + 2]);
-        _analysed = true;
     }
 
     // The points of one run kept by the sampling rule, in a buffer of the reader.

@@ -236,7 +236,7 @@ TEST(ReaderBase, InterfacesAreOfferedOnlyByReadersThatDeriveFromThem)
         }
 
     protected:
-        void Analyse() override { _analysed = true; }
+        void AnalyseFile() override {}
     };
     ZonICloudReadFile_var cloud = std::make_shared<CloudOnly>();
     EXPECT_EQ(ZonQueryInterface<ZonICloudReadScanFile>(cloud), nullptr);
@@ -269,7 +269,7 @@ TEST(ReaderBase, OpeningAMissingFileRaisesTheSystemMessage)
         }
 
     protected:
-        void Analyse() override { OpenFile(); }
+        void AnalyseFile() override { Source(); }
     };
     FileReader missing("/nonexistent/dir/file.asc");
     try {

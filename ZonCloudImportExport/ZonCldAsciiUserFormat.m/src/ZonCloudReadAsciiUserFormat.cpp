@@ -220,9 +220,9 @@ void ZonCloudReadAsciiUserFormat::Discard()
     ClearBoxCaches();
 }
 
-void ZonCloudReadAsciiUserFormat::Analyse()
+void ZonCloudReadAsciiUserFormat::AnalyseFile()
 {
-    if (_analysed || !_fdfRead) return;
+    if (!_fdfRead) return;
     Load(_doublePrecision);
 }
 

@@ -76,7 +76,7 @@ public:
 
 protected:
     // Loads the file when an FDF was read; without one there is nothing to read.
-    void Analyse() override;
+    void AnalyseFile() override;
 
 private:
     struct LineValues;

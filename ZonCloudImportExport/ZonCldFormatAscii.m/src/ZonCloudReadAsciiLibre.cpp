@@ -88,9 +88,8 @@ void ZonCloudReadAsciiLibre::ResetAnalysis()
     Free(_runStarts);
 }
 
-void ZonCloudReadAsciiLibre::Analyse()
+void ZonCloudReadAsciiLibre::AnalyseFile()
 {
-    if (_analysed) return;
     OpenFile();
     struct stat info {};
     const std::int64_t fileSize = fstat(fileno(_file), &info) == 0 ? static_cast<std::int64_t>(info.st_size) : 0;
@@ -143,7 +142,6 @@ void ZonCloudReadAsciiLibre::Analyse()
         ResetAnalysis();
         ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_NoPointFound");
     }
-    _analysed = true;
     _decimalPointSwitched = guard.IsSwitched();
     _decimalPoint = guard.DecimalPoint();
 }

@@ -60,7 +60,7 @@ public:
     const std::string& GetLineFormat() const { return _format.Text(); }
 
 protected:
-    void Analyse() override;
+    void AnalyseFile() override;
 
 private:
     enum class Pass { Done, TooManyUnknown, EndOfFile };

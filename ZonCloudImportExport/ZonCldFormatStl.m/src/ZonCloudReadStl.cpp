@@ -7,12 +7,11 @@
 #include <limits>
 #include <new>
 
-#include <sys/stat.h>
-
 #include "DecimalPointGuard.h"
 #include "ZonCloudOperErrorTool.h"
 #include "ZonCloudReadNLSTool.h"
 #include "ZonCloudScanFormat.h"
+#include "ZonCloudLineSource.h"
 #include "ZonCloudVertexTable.h"
 
 namespace {
@@ -33,93 +32,21 @@ constexpr std::int64_t kMaxTriangles = std::numeric_limits<std::uint32_t>::max()
 
 using Tool = ZonCloudReadNLSTool;
 
-[[noreturn]] void RaiseOutOfMemory()
+// Big blocks for big files, no more than needed for small ones (the line
+// source sizes itself the same way).
+std::size_t BlockSize(const ZonCloudByteSource& source, std::size_t largest)
 {
-    ZonCloudOperError error(ZonCloudOperErrorTool::InsufficientMemoryKey, ZonCloudOperErrorTool::Catalog);
-    error.SetSeverity(4);
-    error.SetSource("ZonCloudReadStl", __LINE__);
-    throw error;
-}
-
-// A short read: the system's error when there was one, else the end of the data.
-[[noreturn]] void RaiseShortRead(FILE* file, Tool::ErrorType type)
-{
-    if (!std::ferror(file) || errno == 0) errno = ENODATA;
-    Tool::Raise(type, nullptr);
-}
-
-// Size of the file, or -1 when the system cannot tell.
-std::int64_t FileSize(FILE* file)
-{
-    struct stat info {};
-    return fstat(fileno(file), &info) == 0 ? static_cast<std::int64_t>(info.st_size) : -1;
-}
-
-// Big blocks for big files, no more than needed for small ones.
-std::size_t BlockSize(FILE* file, std::size_t largest)
-{
-    const std::int64_t size = FileSize(file);
+    const std::int64_t size = source.Size();
     if (size < 0) return largest;
     return std::min<std::size_t>(largest, std::max<std::size_t>(static_cast<std::size_t>(size) + 1, 4096));
 }
 
 // A whole number of records.
-std::size_t RecordBlockSize(FILE* file)
+std::size_t RecordBlockSize(const ZonCloudByteSource& source)
 {
-    const std::size_t size = BlockSize(file, kBlockSize) + kRecordSize;
+    const std::size_t size = BlockSize(source, kBlockSize) + kRecordSize;
     return size - size % kRecordSize;
 }
-
-std::size_t ReadBytes(FILE* file, void* buffer, std::size_t size)
-{
-    errno = 0;
-    const std::size_t got = std::fread(buffer, 1, size, file);
-    if (got < size && std::ferror(file)) {
-        if (errno == 0) errno = EIO;
-        Tool::Raise(Tool::Input, nullptr);
-    }
-    return got;
-}
-
-// The lines of a text file in big blocks, cut as fgets(buffer, 512) cuts them.
-class LineSource {
-public:
-    LineSource(FILE* file, std::size_t blockSize) : _file(file), _buffer(std::max(blockSize, 2 * kLineMax)) {}
-
-    // The next line. It may hold a NUL, where a C string would end it: the
-    // keyword search and the number scan stop there.
-    bool Next(const char*& first, const char*& last)
-    {
-        if (_end - _pos < kLineMax && !_eof) Refill();
-        if (_pos == _end) return false;
-        const char* begin = _buffer.data() + _pos;
-        const std::size_t available = std::min(_end - _pos, kLineMax);
-        const void* newline = std::memchr(begin, '\n', available);
-        const std::size_t length = newline ? static_cast<const char*>(newline) - begin + 1 : available;
-        _pos += length;
-        first = begin;
-        last = begin + length;
-        return true;
-    }
-
-private:
-    void Refill()
-    {
-        std::memmove(_buffer.data(), _buffer.data() + _pos, _end - _pos);
-        _end -= _pos;
-        _pos = 0;
-        const std::size_t wanted = _buffer.size() - _end;
-        const std::size_t got = ReadBytes(_file, _buffer.data() + _end, wanted);
-        _end += got;
-        if (got < wanted) _eof = true;
-    }
-
-    FILE* _file;
-    std::vector<char> _buffer;
-    std::size_t _pos = 0;
-    std::size_t _end = 0;
-    bool _eof = false;
-};
 
 const char* Find(const char* first, const char* last, const char* word)
 {
@@ -179,26 +106,23 @@ bool ParseVertex(const char* first, const char* last, char point, T* xyz)
     return true;
 }
 
-template <bool Reverse>
-float LoadFloat(const unsigned char* p)
-{
-    std::uint32_t bits;
-    std::memcpy(&bits, p, sizeof bits);
-    if constexpr (Reverse) bits = __builtin_bswap32(bits);
-    return std::bit_cast<float>(bits);
-}
-
+// Records are little-endian as the format says; a file written by a
+// big-endian machine is read in the other order.
 template <bool Reverse>
 void LoadCorners(const unsigned char* record, float corners[9])
 {
-    for (int k = 0; k < 9; ++k) corners[k] = LoadFloat<Reverse>(record + kVertexOffset + 4 * k);
+    constexpr bool big = (std::endian::native == std::endian::little) == Reverse;
+    for (int k = 0; k < 9; ++k) {
+        const unsigned char* p = record + kVertexOffset + 4 * k;
+        corners[k] = big ? ZonCloudByteSource::LoadBig<float>(p) : ZonCloudByteSource::LoadLittle<float>(p);
+    }
 }
 
 // Hands each record from the current position to `onRecord`, at most
 // `maxCount` of them, reading the file in big blocks; stops at the first
 // short one. Returns how many were handed.
 template <class OnRecord>
-std::uint64_t ForEachRecord(FILE* file, std::uint64_t maxCount, std::vector<unsigned char>& buffer,
+std::uint64_t ForEachRecord(ZonCloudByteSource& source, std::uint64_t maxCount, std::vector<unsigned char>& buffer,
                             OnRecord onRecord)
 {
     const std::size_t perBlock = buffer.size() / kRecordSize;
@@ -206,7 +130,7 @@ std::uint64_t ForEachRecord(FILE* file, std::uint64_t maxCount, std::vector<unsi
     while (done < maxCount) {
         const std::size_t records = static_cast<std::size_t>(std::min<std::uint64_t>(perBlock, maxCount - done));
         const std::size_t wanted = records * kRecordSize;
-        const std::size_t got = ReadBytes(file, buffer.data(), wanted);
+        const std::size_t got = source.ReadSome(buffer.data(), wanted);
         std::size_t whole = got / kRecordSize;
         // The last record may lack its attribute word.
         if (got < wanted && got % kRecordSize >= kRecordFloats) ++whole;
@@ -275,9 +199,7 @@ ZonCloudReadStl::~ZonCloudReadStl() = default;
 
 void ZonCloudReadStl::Reset()
 {
-    CloseFile();
-    ClearBoxCaches();
-    _analysed = false;
+    Reanalyse();
     _digitizationType = DigitizationUnknown;
     _numberOfPoints = 0;
     _boundingBox.SetToEmpty();
@@ -291,45 +213,26 @@ void ZonCloudReadStl::Reset()
     _vertices = {};
     _verticesDouble = {};
     _triangles = {};
-    _sub = {};
-    _polygonBegun = false;
-    _polygonDelivered = false;
-    _triangleCursor = 0;
-    _boxTriangles = nullptr;
-    _boxTriangleCount = 0;
-    _boxTriangleCursor = 0;
+    _sub.Clear();
+    _cursor.Reset();
 }
 
-void ZonCloudReadStl::Analyse()
+void ZonCloudReadStl::AnalyseFile()
 {
-    if (_reanalyse) {
-        Reset();
-        _reanalyse = false;
-    }
-    if (_analysed) return;
-    try {
-        OpenFile();
-        _isText = IsTextCandidate() && HasVertexLineNearStart();
-        if (_isText)
-            AnalyseText();
-        else
-            AnalyseBinary();
-    } catch (const std::bad_alloc&) {
-        CloseFile();
-        RaiseOutOfMemory();
-    } catch (...) {
-        CloseFile();
-        throw;
-    }
+    Source();
+    _isText = IsTextCandidate() && HasVertexLineNearStart();
+    if (_isText)
+        AnalyseText();
+    else
+        AnalyseBinary();
     _digitizationType = DigitizationPolygons;
     _numberOfPoints = static_cast<int>(std::min<std::uint32_t>(_vertexCount, std::numeric_limits<int>::max()));
-    _analysed = true;
 }
 
 bool ZonCloudReadStl::IsTextCandidate()
 {
     char head[kLineMax + 1] = {};
-    const std::size_t got = ReadBytes(_file, head, kLineMax);
+    const std::size_t got = _source.ReadSome(head, kLineMax);
     const auto contains = [&](const char* word) {
         return std::search(head, head + got, word, word + 5) != head + got;
     };
@@ -340,8 +243,8 @@ bool ZonCloudReadStl::IsTextCandidate()
 // start makes the file text.
 bool ZonCloudReadStl::HasVertexLineNearStart()
 {
-    SeekFile(0);
-    LineSource lines(_file, BlockSize(_file, 64 * 1024));
+    ZonCloudLineSource lines(kLineMax, BlockSize(_source, 64 * 1024));
+    lines.Start(_source, 0);
     const char* first = nullptr;
     const char* last = nullptr;
     for (int without = 0; without < kKindTestLines && lines.Next(first, last); ++without)
@@ -354,8 +257,8 @@ void ZonCloudReadStl::AnalyseText()
     DecimalPointGuard separator;
     bool otherTried = false;
     for (;;) {
-        SeekFile(0);
-        LineSource lines(_file, BlockSize(_file, kBlockSize));
+        ZonCloudLineSource lines(kLineMax, BlockSize(_source, kBlockSize));
+        lines.Start(_source, 0);
         BoxAccumulator<double> box;
         std::uint64_t found = 0;
         int failures = 0;
@@ -402,14 +305,15 @@ void ZonCloudReadStl::AnalyseText()
 
 void ZonCloudReadStl::AnalyseBinary()
 {
-    SeekFile(0);
+    _source.Seek(0);
     unsigned char header[kHeaderSize];
-    if (ReadBytes(_file, header, kHeaderSize) < kHeaderSize) RaiseShortRead(_file, Tool::Data);
-    std::int32_t stored = 0;
-    if (ReadBytes(_file, &stored, sizeof stored) < sizeof stored) RaiseShortRead(_file, Tool::Input);
-    const auto reversed = static_cast<std::int32_t>(__builtin_bswap32(static_cast<std::uint32_t>(stored)));
+    _source.Read(header, kHeaderSize, Tool::Data);
+    unsigned char word[4];
+    _source.Read(word, sizeof word);
+    const auto stored = ZonCloudByteSource::LoadLittle<std::int32_t>(word);
+    const auto reversed = ZonCloudByteSource::LoadBig<std::int32_t>(word);
 
-    const std::int64_t size = FileSize(_file);
+    const std::int64_t size = _source.Size();
     const std::int64_t fits = size > 0 ? (size - 84) / static_cast<std::int64_t>(kRecordSize) : -1;
 
     const CountChoice choice = ChooseCount(stored, reversed, fits);
@@ -418,7 +322,7 @@ void ZonCloudReadStl::AnalyseBinary()
     if (choice.count < 0) Tool::Raise(Tool::Input, "ERR_UnknownData");
 
     // The count word is only a bound: what counts is what the file holds.
-    std::vector<unsigned char> buffer(RecordBlockSize(_file));
+    std::vector<unsigned char> buffer(RecordBlockSize(_source));
     BoxAccumulator<float> box;
     const auto widen = [&box](const float* corners) {
         box.Add(corners);
@@ -428,13 +332,13 @@ void ZonCloudReadStl::AnalyseBinary()
     const std::uint64_t wanted = static_cast<std::uint64_t>(std::min(choice.count, kMaxTriangles));
     std::uint64_t records;
     if (_nativeOrder)
-        records = ForEachRecord(_file, wanted, buffer, [&](const unsigned char* record) {
+        records = ForEachRecord(_source, wanted, buffer, [&](const unsigned char* record) {
             float corners[9];
             LoadCorners<false>(record, corners);
             widen(corners);
         });
     else
-        records = ForEachRecord(_file, wanted, buffer, [&](const unsigned char* record) {
+        records = ForEachRecord(_source, wanted, buffer, [&](const unsigned char* record) {
             float corners[9];
             LoadCorners<true>(record, corners);
             widen(corners);
@@ -451,15 +355,6 @@ void ZonCloudReadStl::AnalyseBinary()
                            extent[0] * extent[1] * extent[2] < 3.4028234663852886e+38;
     if (!plausible) Tool::Raise(Tool::Input, "ERR_UnknownData");
     _boundingBox = box.Box();
-}
-
-void ZonCloudReadStl::SeekFile(long offset)
-{
-    errno = 0;
-    if (!_file || std::fseek(_file, offset, SEEK_SET) != 0) {
-        if (errno == 0) errno = EBADF;
-        Tool::Raise(Tool::Input, nullptr);
-    }
 }
 
 bool ZonCloudReadStl::IsTextFile()
@@ -480,7 +375,7 @@ void ZonCloudReadStl::SetBinaryFrom(int from)
     if (from == _byteOrder) return;
     _byteOrder = from;
     _nativeOrder = from != Differ;
-    _reanalyse = true;
+    Reset();
 }
 
 // ---------------------------------------------------------------- mesh
@@ -490,29 +385,24 @@ void ZonCloudReadStl::LoadMesh()
     Analyse();
     if (_meshLoaded) return;
     try {
-        if (!_file) OpenFile();
-        _meshInDouble = _isText && _doublePrecision;
-        if (!_isText)
-            ReadBinaryMesh();
-        else if (_meshInDouble)
-            ReadTextMesh(_verticesDouble);
-        else
-            ReadTextMesh(_vertices);
-    } catch (const std::bad_alloc&) {
-        CloseFile();
-        _vertices = {};
-        _verticesDouble = {};
-        _triangles = {};
-        RaiseOutOfMemory();
+        Guarded([this] {
+            Source();
+            _meshInDouble = _isText && _doublePrecision;
+            if (!_isText)
+                ReadBinaryMesh();
+            else if (_meshInDouble)
+                ReadTextMesh(_verticesDouble);
+            else
+                ReadTextMesh(_vertices);
+        });
     } catch (...) {
-        CloseFile();
         _vertices = {};
         _verticesDouble = {};
         _triangles = {};
         throw;
     }
     // Everything is in memory now.
-    CloseFile();
+    CloseSource();
     _meshLoaded = true;
     _numberOfPoints = static_cast<int>(std::min<std::size_t>(_distinctCount, std::numeric_limits<int>::max()));
 }
@@ -532,7 +422,6 @@ void ShrinkIfLoose(std::vector<T>& v)
 template <class T>
 void ZonCloudReadStl::ReadTextMesh(std::vector<T>& vertices)
 {
-    SeekFile(0);
     DecimalPointGuard separator;
     if (_separatorSwitched) separator.Switch();
     const char point = separator.DecimalPoint();
@@ -541,7 +430,8 @@ void ZonCloudReadStl::ReadTextMesh(std::vector<T>& vertices)
     vertices.reserve(3 * ExpectedDistinct(_triangleCount));
     _triangles.resize(3 * static_cast<std::size_t>(_triangleCount));
     ZonCloudVertexTable<T> table(vertices, ExpectedDistinct(_triangleCount));
-    LineSource lines(_file, BlockSize(_file, kBlockSize));
+    ZonCloudLineSource lines(kLineMax, BlockSize(_source, kBlockSize));
+    lines.Start(_source, 0);
     T corners[9];
     int pending = 0;
     std::size_t stored = 0;
@@ -565,15 +455,15 @@ void ZonCloudReadStl::ReadTextMesh(std::vector<T>& vertices)
 
 void ZonCloudReadStl::ReadBinaryMesh()
 {
-    SeekFile(kCountOffset);
-    std::int32_t ignored = 0;
-    if (ReadBytes(_file, &ignored, sizeof ignored) < sizeof ignored) RaiseShortRead(_file, Tool::Input);
+    _source.Seek(kCountOffset);
+    unsigned char ignored[4];
+    _source.Read(ignored, sizeof ignored);
 
     _vertices.clear();
     _vertices.reserve(3 * ExpectedDistinct(_triangleCount));
     _triangles.resize(3 * static_cast<std::size_t>(_triangleCount));
     ZonCloudVertexTable<float> table(_vertices, ExpectedDistinct(_triangleCount));
-    std::vector<unsigned char> buffer(RecordBlockSize(_file));
+    std::vector<unsigned char> buffer(RecordBlockSize(_source));
     // Records are merged in small batches whose table slots are prefetched
     // together: on big meshes the table does not fit in the cache.
     constexpr std::size_t kBatch = 16;
@@ -593,12 +483,12 @@ void ZonCloudReadStl::ReadBinaryMesh()
     };
     std::uint64_t stored;
     if (_nativeOrder)
-        stored = ForEachRecord(_file, _triangleCount, buffer, [&](const unsigned char* record) {
+        stored = ForEachRecord(_source, _triangleCount, buffer, [&](const unsigned char* record) {
             LoadCorners<false>(record, corners[batched]);
             if (++batched == kBatch) flush();
         });
     else
-        stored = ForEachRecord(_file, _triangleCount, buffer, [&](const unsigned char* record) {
+        stored = ForEachRecord(_source, _triangleCount, buffer, [&](const unsigned char* record) {
             LoadCorners<true>(record, corners[batched]);
             if (++batched == kBatch) flush();
         });
@@ -615,7 +505,7 @@ const float* ZonCloudReadStl::FloatVertices()
             _vertices.assign(_verticesDouble.begin(), _verticesDouble.end());
         } catch (const std::bad_alloc&) {
             _vertices = {};
-            RaiseOutOfMemory();
+            RaiseMemoryError();
         }
     }
     return _vertices.data();
@@ -628,7 +518,7 @@ const double* ZonCloudReadStl::DoubleVertices()
             _verticesDouble.assign(_vertices.begin(), _vertices.end());
         } catch (const std::bad_alloc&) {
             _verticesDouble = {};
-            RaiseOutOfMemory();
+            RaiseMemoryError();
         }
     }
     return _verticesDouble.data();
@@ -660,21 +550,17 @@ void ZonCloudReadStl::BeginGetPolygon()
 {
     if (GetTypeOfDigitization() != DigitizationPolygons) Tool::Raise(Tool::Usage, "ERR_NotAPolygonDigit");
     if (_vertexCount == 0 || _triangleCount == 0) {
-        CloseFile();
+        CloseSource();
         Tool::Raise(Tool::Data, "ERR_NoPointFound");
     }
-    _polygonBegun = true;
-    _polygonDelivered = false;
-    _triangleCursor = 0;
+    _cursor.Begin(1);
 }
 
 bool ZonCloudReadStl::NextPolygon()
 {
-    if (!_polygonBegun) Tool::Raise(Tool::Usage, "ERR_BeginGetPolygonNotDone");
-    if (_polygonDelivered) return false;
+    if (!_cursor.HasNext()) return false;
     LoadMesh();
-    _polygonDelivered = true;
-    _triangleCursor = 0;
+    _cursor.Advance();
     return true;
 }
 
@@ -690,15 +576,10 @@ const unsigned* ZonCloudReadStl::GetTriangles(unsigned& count)
 const unsigned* ZonCloudReadStl::NextTriangle()
 {
     LoadMesh();
-    if (_triangleCursor >= _triangles.size() / 3) return nullptr;
-    return _triangles.data() + 3 * _triangleCursor++;
+    return _cursor.NextTriangle(_triangles.data(), _triangles.size() / 3);
 }
 
-const unsigned* ZonCloudReadStl::NextTriangleInBox()
-{
-    if (!_boxTriangles || _boxTriangleCursor >= _boxTriangleCount) return nullptr;
-    return _boxTriangles + 3 * _boxTriangleCursor++;
-}
+const unsigned* ZonCloudReadStl::NextTriangleInBox() { return _cursor.NextTriangleInBox(); }
 
 const unsigned* ZonCloudReadStl::GetTrianglesInBox(const ZonMathBox& box, unsigned& count, const float*& vertices,
                                                    unsigned& vertexCount)
@@ -707,52 +588,25 @@ const unsigned* ZonCloudReadStl::GetTrianglesInBox(const ZonMathBox& box, unsign
     if (box.IsSameAs(_boundingBox)) {
         vertices = FloatVertices();
         vertexCount = DistinctCount();
-        _boxTriangles = _triangles.data();
-        _boxTriangleCount = _triangles.size() / 3;
-    } else {
-        if (!_sub.valid || !box.IsSameAs(_sub.box)) ComputeSubMesh(box);
-        vertices = _sub.vertices.data();
-        vertexCount = static_cast<unsigned>(_sub.vertices.size() / 3);
-        _boxTriangles = _sub.triangles.data();
-        _boxTriangleCount = _sub.triangles.size() / 3;
+        _cursor.SetBoxTriangles(_triangles.data(), _triangles.size() / 3);
+        count = static_cast<unsigned>(_triangles.size() / 3);
+        return _triangles.data();
     }
-    _boxTriangleCursor = 0;
-    count = static_cast<unsigned>(_boxTriangleCount);
-    return _boxTriangles;
-}
-
-void ZonCloudReadStl::ComputeSubMesh(const ZonMathBox& box)
-{
-    _sub = {};
-    _sub.box = box;
-    _sub.valid = true;
-    if (!box.Intersects(_boundingBox, 0.0)) return;
-    constexpr std::uint32_t outside = std::numeric_limits<std::uint32_t>::max();
-    try {
-        std::vector<std::uint32_t> renumbered(_distinctCount, outside);
-        std::uint32_t inside = 0;
-        const auto keep = [&](const auto* v, std::size_t i) {
-            if (!IsInQueryBox(v[0], v[1], v[2], box, _boundingBox)) return;
-            renumbered[i] = inside++;
-            _sub.vertices.push_back(static_cast<float>(v[0]));
-            _sub.vertices.push_back(static_cast<float>(v[1]));
-            _sub.vertices.push_back(static_cast<float>(v[2]));
-        };
-        for (std::size_t i = 0; i < _distinctCount; ++i) {
+    if (!_sub.IsFor(box)) {
+        try {
             if (_meshInDouble)
-                keep(_verticesDouble.data() + 3 * i, i);
+                _sub.Compute(box, _boundingBox, _verticesDouble.data(), _distinctCount, _triangles.data(),
+                             _triangles.size() / 3);
             else
-                keep(_vertices.data() + 3 * i, i);
+                _sub.Compute(box, _boundingBox, _vertices.data(), _distinctCount, _triangles.data(),
+                             _triangles.size() / 3);
+        } catch (const std::bad_alloc&) {
+            RaiseMemoryError();
         }
-        for (std::size_t t = 0; t + 2 < _triangles.size(); t += 3) {
-            const std::uint32_t a = renumbered[_triangles[t]];
-            const std::uint32_t b = renumbered[_triangles[t + 1]];
-            const std::uint32_t c = renumbered[_triangles[t + 2]];
-            if (a == outside || b == outside || c == outside) continue;
-            _sub.triangles.insert(_sub.triangles.end(), {a, b, c});
-        }
-    } catch (const std::bad_alloc&) {
-        _sub = {};
-        RaiseOutOfMemory();
     }
+    vertices = _sub.Vertices().data();
+    vertexCount = _sub.VertexCount();
+    _cursor.SetBoxTriangles(_sub.Triangles().data(), _sub.TriangleCount());
+    count = _sub.TriangleCount();
+    return _sub.Triangles().data();
 }

@@ -2,7 +2,9 @@
 #include <cstdint>
 #include <vector>
 
+#include "ZonCloudPolygonCursor.h"
 #include "ZonCloudReadFile.h"
+#include "ZonCloudSubMesh.h"
 #include "ZonICloudReadOptBinMachine.h"
 #include "ZonICloudReadOptFreeEdges.h"
 #include "ZonICloudReadOptTriangles.h"
@@ -56,17 +58,9 @@ public:
     bool IsTextFile();
 
 protected:
-    void Analyse() override;
+    void AnalyseFile() override;
 
 private:
-    // Result of a sub-box query.
-    struct SubMesh {
-        ZonMathBox box;
-        bool valid = false;
-        std::vector<float> vertices;
-        std::vector<std::uint32_t> triangles;
-    };
-
     void Reset();
     bool IsTextCandidate();
     bool HasVertexLineNearStart();
@@ -76,13 +70,10 @@ private:
     template <class T>
     void ReadTextMesh(std::vector<T>& vertices);
     void ReadBinaryMesh();
-    void SeekFile(long offset);
-    void ComputeSubMesh(const ZonMathBox& box);
     const float* FloatVertices();
     const double* DoubleVertices();
     unsigned DistinctCount() const { return static_cast<unsigned>(_distinctCount); }
 
-    bool _reanalyse = false;
     bool _isText = false;
     bool _separatorSwitched = false;
     bool _nativeOrder = true;
@@ -100,13 +91,6 @@ private:
     std::vector<float> _vertices;
     std::vector<double> _verticesDouble;
     std::vector<std::uint32_t> _triangles;
-    SubMesh _sub;
-
-    // Polygon protocol.
-    bool _polygonBegun = false;
-    bool _polygonDelivered = false;
-    std::size_t _triangleCursor = 0;
-    const std::uint32_t* _boxTriangles = nullptr;
-    std::size_t _boxTriangleCount = 0;
-    std::size_t _boxTriangleCursor = 0;
+    ZonCloudSubMesh _sub;
+    ZonCloudPolygonCursor _cursor;
 };

@@ -1,6 +1,9 @@
 #include "ZonCloudReadFile.h"
 
 #include <cerrno>
+#include <cstdlib>
+#include <cxxabi.h>
+#include <typeinfo>
 #include <new>
 #include <type_traits>
 
@@ -308,13 +311,44 @@ const double* ZonCloudReadFile::GetGridPointsInBoxDouble(const ZonMathBox& box, 
     });
 }
 
+void ZonCloudReadFile::SetSourceMemory(const void* data, std::size_t size)
+{
+    CloseSource();
+    _memory = data;
+    _memorySize = size;
+    Reanalyse();
+}
+
+void ZonCloudReadFile::Analyse()
+{
+    if (_analysed) return;
+    Guarded([this] { AnalyseFile(); });
+    _analysed = true;
+}
+
+void ZonCloudReadFile::Reanalyse()
+{
+    CloseSource();
+    ClearBoxCaches();
+    _analysed = false;
+}
+
+ZonCloudByteSource& ZonCloudReadFile::Source()
+{
+    if (_source.IsOpen()) return _source;
+    if (_memory)
+        _source.OpenMemory(_memory, _memorySize);
+    else
+        _source.Open(_fileName.ToUtf8());
+    return _source;
+}
+
 void ZonCloudReadFile::OpenFile()
 {
     CloseFile();
     errno = 0;
     _file = std::fopen(_fileName.c_str(), "rb");
     if (!_file) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, nullptr);
-    // A directory opens as a stream on this system; refuse it as the open would elsewhere.
     struct stat info {};
     if (fstat(fileno(_file), &info) == 0 && S_ISDIR(info.st_mode)) {
         CloseFile();
@@ -336,6 +370,17 @@ void ZonCloudReadFile::CloseFile()
 {
     if (_file) std::fclose(_file);
     _file = nullptr;
+}
+
+void ZonCloudReadFile::RaiseMemoryError() const
+{
+    ZonCloudOperError error(ZonCloudOperErrorTool::InsufficientMemoryKey, ZonCloudOperErrorTool::Catalog);
+    error.SetSeverity(4);
+    int status = 0;
+    char* name = abi::__cxa_demangle(typeid(*this).name(), nullptr, nullptr, &status);
+    error.SetSource(status == 0 && name ? name : typeid(*this).name(), 0);
+    std::free(name);
+    throw error;
 }
 
 void ZonCloudReadFile::ClearBoxCaches()

@@ -1,15 +1,21 @@
 #pragma once
+#include <cstddef>
 #include <cstdio>
+#include <new>
+#include <stdexcept>
 #include <vector>
 
 #include "ZonBaseUnknown.h"
 #include "ZonCldExport.h"
+#include "ZonCloudByteSource.h"
 #include "ZonICloudReadFile.h"
 
-// Base of every reader: file name, open stream, sampling percent, type of
+// Base of every reader: file name, byte source, sampling percent, type of
 // digitization, double-precision mode, and the one-box cache of clipped points.
-// A derived reader implements Analyse (run once, on the first question that
-// needs content) and the point queries; the base answers everything else.
+// The base owns the lifecycle: Analyse runs the reader's AnalyseFile hook once,
+// on the first question that needs content, closes the source on any failure
+// and turns memory exhaustion into the memory error. A derived reader writes
+// the hook and the point queries; the base answers everything else.
 class ZON_CLD_API ZonCloudReadFile : public ZonBaseUnknown, public ZonICloudReadFile {
 public:
     explicit ZonCloudReadFile(const ZonUnicodeString& fileName);
@@ -61,21 +67,70 @@ public:
     // the upper face closed where the query's high equals the file's high.
     static bool IsInQueryBox(double x, double y, double z, const ZonMathBox& query, const ZonMathBox& file);
 
-protected:
-    // Opens the file, finds the type, counts the points, computes the box.
-    // Must return at once when already analysed.
-    virtual void Analyse() = 0;
+    // Reads `size` bytes at `data` instead of the file (archive members, fuzz
+    // inputs); the caller keeps them alive as long as the reader.
+    void SetSourceMemory(const void* data, std::size_t size);
 
-    // Opens _file read-only ("rb"); a failure raises type 3 with the errno message.
+protected:
+    // Runs AnalyseFile once; returns at once when already analysed.
+    void Analyse();
+    // The reader's analysis: opens the source (Source()), finds the type,
+    // counts the points, computes the box. The source may stay open for later
+    // reads; the base closes it on failure and when the reader goes.
+    virtual void AnalyseFile() = 0;
+    // Forgets the analysis (an option changed what is read): the next question analyses again.
+    void Reanalyse();
+
+    // The source, opened on first use; an open failure raises type 3 with the
+    // system's message.
+    ZonCloudByteSource& Source();
+    void CloseSource() { _source.Close(); }
+    // Stream access of the readers not yet on the byte source; goes once they are.
     void OpenFile();
-    // Rewinds _file; a failure raises type 1 with the errno message.
     void RewindFile();
     void CloseFile();
+    FILE* _file = nullptr;
+    // Runs `work`, which reads the source: any failure closes it, and memory
+    // exhaustion raises the memory error.
+    template <class Work>
+    void Guarded(Work&& work)
+    {
+        try {
+            work();
+        } catch (const std::bad_alloc&) {
+            CloseSource();
+            RaiseMemoryError();
+        } catch (const std::length_error&) {
+            CloseSource();
+            RaiseMemoryError();
+        } catch (...) {
+            CloseSource();
+            throw;
+        }
+    }
+    // The memory error of the module, naming this reader as its source.
+    [[noreturn]] void RaiseMemoryError() const;
+    // Room for n elements; an allocation that fails or that no vector could
+    // hold ends as the memory error, never as a standard exception.
+    template <class T>
+    void Reserve(std::vector<T>& v, std::uint64_t n) const
+    {
+        try {
+            if (n > v.max_size()) RaiseMemoryError();
+            v.reserve(static_cast<std::size_t>(n));
+        } catch (const std::bad_alloc&) {
+            RaiseMemoryError();
+        } catch (const std::length_error&) {
+            RaiseMemoryError();
+        }
+    }
     // Frees the three box caches and marks the cached box empty.
     void ClearBoxCaches();
 
     ZonUnicodeString _fileName;
-    FILE* _file = nullptr;
+    ZonCloudByteSource _source;
+    const void* _memory = nullptr;  // SetSourceMemory's bytes, read instead of the file
+    std::size_t _memorySize = 0;
     float _samplingPercent = 100.0f;
     int _digitizationType = DigitizationUnknown;
     bool _doublePrecision = false;

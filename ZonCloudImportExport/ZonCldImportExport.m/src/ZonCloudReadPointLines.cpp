@@ -48,9 +48,8 @@ void ZonCloudReadPointLines::Discard()
     ClearBoxCaches();
 }
 
-void ZonCloudReadPointLines::Analyse()
+void ZonCloudReadPointLines::AnalyseFile()
 {
-    if (_analysed) return;
     Load(_doublePrecision);
 }
 

@@ -31,7 +31,7 @@ protected:
     virtual bool ScanLine(const char* line, char decimalPoint, double xyz[3], unsigned char rgb[3]) = 0;
     // Forgets what was loaded; a format that keeps more forgets that too.
     virtual void Discard();
-    void Analyse() override;
+    void AnalyseFile() override;
     void Load(bool asDouble);
 
     static constexpr int LineSize = 512;  // lines of at most 511 characters

@@ -1,0 +1,39 @@
+#pragma once
+#include <cstddef>
+#include <cstdint>
+#include <vector>
+
+#include "ZonCldExport.h"
+#include "ZonMath.h"
+
+// The part of a mesh inside a query box: the triangles whose three vertices
+// are inside (by the box queries' inclusion rule), renumbered into the
+// vertices inside, which keep their order. The last box and its answer are
+// kept, so asking again for the same box costs nothing.
+class ZON_CLD_API ZonCloudSubMesh {
+public:
+    bool IsFor(const ZonMathBox& box) const { return _valid && box.IsSameAs(_box); }
+    void Clear() { *this = ZonCloudSubMesh(); }
+
+    // `fileBox` is the mesh's own box (its upper faces are closed). An
+    // allocation failure leaves the sub-mesh empty and raises std::bad_alloc.
+    void Compute(const ZonMathBox& box, const ZonMathBox& fileBox, const float* vertices, std::size_t vertexCount,
+                 const std::uint32_t* triangles, std::size_t triangleCount);
+    void Compute(const ZonMathBox& box, const ZonMathBox& fileBox, const double* vertices, std::size_t vertexCount,
+                 const std::uint32_t* triangles, std::size_t triangleCount);
+
+    const std::vector<float>& Vertices() const { return _vertices; }
+    const std::vector<std::uint32_t>& Triangles() const { return _triangles; }
+    unsigned VertexCount() const { return static_cast<unsigned>(_vertices.size() / 3); }
+    unsigned TriangleCount() const { return static_cast<unsigned>(_triangles.size() / 3); }
+
+private:
+    template <class T>
+    void Build(const ZonMathBox& box, const ZonMathBox& fileBox, const T* vertices, std::size_t vertexCount,
+               const std::uint32_t* triangles, std::size_t triangleCount);
+
+    ZonMathBox _box;
+    bool _valid = false;
+    std::vector<float> _vertices;
+    std::vector<std::uint32_t> _triangles;
+};
