@@ -1,28 +1,23 @@
 // Any bytes as an STL file end in a mesh or a catalog error. The mesh is read
 // in single and double precision and queried in a box inside its own.
-#include <unistd.h>
-
+#include <cstddef>
 #include <cstdint>
-#include <cstdio>
 #include <cstdlib>
-#include <fstream>
 
 #include "ZonCloudReadStl.h"
 #include "ZonError.h"
 
 namespace {
 
-// A plain array, still there when the exit handler removes the file.
-char gPath[64];
-
 void Check(bool condition)
 {
     if (!condition) std::abort();
 }
 
-void ReadAll(bool doublePrecision)
+void ReadAll(const std::uint8_t* data, std::size_t size, bool doublePrecision)
 {
-    ZonCloudReadStl reader{ZonUnicodeString(gPath)};
+    ZonCloudReadStl reader{ZonUnicodeString("fuzz.stl")};
+    reader.SetSourceMemory(data, size);
     reader.SetDoublePrecision(doublePrecision);
     try {
         reader.BeginGetPolygon();
@@ -58,13 +53,6 @@ void ReadAll(bool doublePrecision)
 
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size)
 {
-    if (!gPath[0]) {
-        std::snprintf(gPath, sizeof gPath, "/tmp/fuzz_stl_%d.stl", static_cast<int>(getpid()));
-        std::atexit([] { std::remove(gPath); });
-    }
-    // The stream is closed at the end of the condition, before the file is read.
-    if (!std::ofstream(gPath, std::ios::binary).write(reinterpret_cast<const char*>(data), std::streamsize(size)))
-        return 0;
-    for (bool doublePrecision : {false, true}) ReadAll(doublePrecision);
+    for (bool doublePrecision : {false, true}) ReadAll(data, size, doublePrecision);
     return 0;
 }
