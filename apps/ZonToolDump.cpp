@@ -44,11 +44,11 @@ public:
         out["bbox"] = BoxJson(box);
         out["points"] = _reader->GetNumberOfPoints();
         out["cloud"] = Cloud();
-        if (type == 2)
+        if (type == DigitizationScans)
             if (auto scans = ZonQueryInterface<ZonICloudReadScanFile>(_reader)) out["sets"] = Sets(*scans);
-        if (type == 3)
+        if (type == DigitizationGrids)
             if (auto grids = ZonQueryInterface<ZonICloudReadGridFile>(_reader)) out["grids"] = Grids(*grids);
-        if (type == 4)
+        if (type == DigitizationPolygons)
             if (auto polygons = ZonQueryInterface<ZonICloudReadPolygonFile>(_reader)) out["polygons"] = Polygons(*polygons);
         return out;
     }

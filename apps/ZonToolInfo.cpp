@@ -10,10 +10,10 @@ namespace {
 const char* TypeName(int type)
 {
     switch (type) {
-        case 1: return "cloud";
-        case 2: return "scans";
-        case 3: return "grids";
-        case 4: return "polygons";
+        case DigitizationCloud: return "cloud";
+        case DigitizationScans: return "scans";
+        case DigitizationGrids: return "grids";
+        case DigitizationPolygons: return "polygons";
         default: return "unknown";
     }
 }

@@ -27,7 +27,7 @@ void ReadOnce(const std::string& path, std::size_t size, bool scans)
     const unsigned count = static_cast<unsigned>(reader->GetNumberOfPoints());
     ZonMathBox box;
     reader->GetBoundingBox(box);
-    Check((type == 1 || type == 2) && count > 0 && !box.IsEmpty());
+    Check((type == DigitizationCloud || type == DigitizationScans) && count > 0 && !box.IsEmpty());
 
     unsigned n = 0, nd = 0;
     const float* points = reader->GetPoints(n);

@@ -4,6 +4,8 @@
 
 #include "MemoryReaders.h"
 #include "ZonCldImportEngine.h"
+#include "ZonCloudReadNLSTool.h"
+#include "ZonMsgCatalog.h"
 #include "ZonTestFiles.h"
 
 namespace {
@@ -25,13 +27,19 @@ struct Settings {
     double scale = 1.0;
 };
 
+// The labels the import entry gives the engine.
+std::string ModuleLabel(const std::string& key)
+{
+    return ZonMsgCatalog::Lookup(ZonCloudReadNLSTool::Catalog(), "ZonCldImportBuild.StatWindow." + key);
+}
+
 template <class Reader = MemoryReader>
-Import Walk(const MemoryContent& content, const Settings& s = {})
+Import Walk(const MemoryContent& content, const Settings& s = {}, const ZonCldStatLabeler& labeler = ModuleLabel)
 {
     ZonGeoFactoryProtected factory;
     Import r{factory.CreateCldBody(), {}, {}};
     ZonCldImportEngine::InsertFile(*r.body, factory, std::make_shared<Reader>("f", content), s.doublePrecision, s.unit,
-                                   s.box, s.scale, r.messages, r.statistics, true);
+                                   s.box, s.scale, r.messages, r.statistics, true, labeler);
     return r;
 }
 
@@ -66,16 +74,16 @@ MemoryContent CloudContent()
             .symbols = {5, 6, 7, 8}, .texts = {"a", "b", "c", "d"}};
 }
 // The second scan of the first set is empty.
-MemoryContent ScanContent() { return {.type = 2, .sets = {{Line(3), {}, Line(2, 10)}, {Line(4, 20)}}}; }
+MemoryContent ScanContent() { return {.type = DigitizationScans, .sets = {{Line(3), {}, Line(2, 10)}, {Line(4, 20)}}}; }
 // Grid 1: two rows of three, a hole in the second row. Grid 2: one row, no validity array.
 MemoryContent GridContent()
 {
-    return {.type = 3, .grids = {{{Line(3), {}}, {Line(3, 5), {1, 0, 1}}}, {{Line(2, 30), {}}}}};
+    return {.type = DigitizationGrids, .grids = {{{Line(3), {}}, {Line(3, 5), {1, 0, 1}}}, {{Line(2, 30), {}}}}};
 }
 // A unit square in z = 0 made of two triangles, and a lone triangle at x = 5..6.
 MemoryContent MeshContent()
 {
-    return {.type = 4,
+    return {.type = DigitizationPolygons,
             .meshes = {{{0, 0, 0, 1, 0, 0, 1, 1, 0, 0, 1, 0}, {0, 1, 2, 0, 2, 3}},
                        {{5, 0, 0, 6, 0, 0, 6, 1, 0}, {0, 1, 2}}}};
 }
@@ -85,7 +93,7 @@ TEST(ImportEngine, CloudKeepsItsPerPointArraysAndTheBoxNarrowsThem)
     Import r = Walk(CloudContent());
     ASSERT_EQ(r.body->GetClouds().size(), 1u);
     const ZonCldCloud* cloud = r.body->GetClouds()[0].get();
-    EXPECT_EQ(r.body->GetTypeOfDigitization(), 1);
+    EXPECT_EQ(r.body->GetTypeOfDigitization(), DigitizationCloud);
     EXPECT_EQ(FloatsOf(cloud->Points()), Line(4));
     EXPECT_EQ(cloud->Colors(), CloudContent().colors);
     EXPECT_EQ(cloud->Alphas(), (Ints{1, 2, 3, 4}));
@@ -170,7 +178,7 @@ TEST(ImportEngine, ScansAreWalkedSetBySetAndEmptyScansLeftOut)
     ASSERT_EQ(r.body->GetSetsOfScans()[0]->GetNumberOfScans(), 1u);
     EXPECT_EQ(FloatsOf(r.body->GetSetsOfScans()[0]->GetScans()[0]->Points()), Line(2, 10));
     EXPECT_EQ(FloatsOf(r.body->GetSetsOfScans()[1]->GetScans()[0]->Points()), Line(2, 20));
-    r = Walk({.type = 2, .hasDouble = true, .doubleOffset = 0.25, .sets = ScanContent().sets}, s);
+    r = Walk({.type = DigitizationScans, .hasDouble = true, .doubleOffset = 0.25, .sets = ScanContent().sets}, s);
     const ZonCldPointArray& points = r.body->GetSetsOfScans()[1]->GetScans()[0]->Points();
     EXPECT_TRUE(points.IsDoublePrecision());
     EXPECT_EQ(points.GetPoint(0)[0], 20.25);
@@ -243,6 +251,10 @@ TEST(ImportEngine, StatisticsNameWhatWasCreated)
                              "  Bounding box: 0 0 0 / 46 92 138\n"})
         EXPECT_NE(r.statistics.find(line), std::string::npos) << line << r.statistics;
     EXPECT_EQ(r.statistics.find("Grids"), std::string::npos);
+
+    // Without a labeler the engine labels with the bare keys: it knows no catalog.
+    const Import bare = Walk(ScanContent(), {}, {});
+    EXPECT_NE(bare.statistics.find("  SetsOfScans: 2\n"), std::string::npos) << bare.statistics;
 }
 
 TEST(ImportEngine, ReaderErrorsPassThrough)

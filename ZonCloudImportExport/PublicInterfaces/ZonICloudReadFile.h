@@ -6,7 +6,8 @@
 #include "ZonMath.h"
 #include "ZonUnicodeString.h"
 
-// What a file holds, as the analysis finds it.
+// What a file holds, as the analysis finds it. The interfaces carry it as an
+// int and callers store it, so the values never change.
 enum DigitizationType : int {
     DigitizationUnknown = 0,
     DigitizationCloud = 1,
@@ -18,7 +19,7 @@ enum DigitizationType : int {
 // Every reader: the whole file as one cloud of points.
 class ZON_CLD_API ZonICloudReadFile {
 public:
-    virtual ~ZonICloudReadFile();
+    virtual ~ZonICloudReadFile() = default;
     virtual void GetFileName(ZonUnicodeString& name) = 0;
     virtual void SetSamplingPercent(float percent) = 0;
     virtual float GetSamplingPercent() = 0;

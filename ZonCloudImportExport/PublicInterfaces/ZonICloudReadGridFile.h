@@ -7,7 +7,7 @@
 // Readers whose files hold regular grids; each point has a validity byte (1 valid, 0 hole).
 class ZON_CLD_API ZonICloudReadGridFile {
 public:
-    virtual ~ZonICloudReadGridFile();
+    virtual ~ZonICloudReadGridFile() = default;
     virtual void BeginGetGrid() = 0;
     virtual bool NextGrid() = 0;
     virtual void BeginGetGridPoints() = 0;

@@ -6,7 +6,7 @@
 // the import entry reads it and tells the host engine.
 class ZON_CLD_API ZonICloudReadOptTriangles {
 public:
-    virtual ~ZonICloudReadOptTriangles();
+    virtual ~ZonICloudReadOptTriangles() = default;
     virtual void SetTriangles(bool create) = 0;
     virtual void GetTriangles(bool& create) = 0;
 };

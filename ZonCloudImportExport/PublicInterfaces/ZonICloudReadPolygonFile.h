@@ -8,7 +8,7 @@
 // vertex indices each.
 class ZON_CLD_API ZonICloudReadPolygonFile {
 public:
-    virtual ~ZonICloudReadPolygonFile();
+    virtual ~ZonICloudReadPolygonFile() = default;
     virtual void BeginGetPolygon() = 0;
     virtual bool NextPolygon() = 0;
     // Two yes/no queries of the mesh; every format read here answers false.

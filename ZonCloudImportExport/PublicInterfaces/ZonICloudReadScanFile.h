@@ -7,7 +7,7 @@
 // Readers whose files hold sets of scans.
 class ZON_CLD_API ZonICloudReadScanFile {
 public:
-    virtual ~ZonICloudReadScanFile();
+    virtual ~ZonICloudReadScanFile() = default;
     virtual void BeginGetSetOfScans() = 0;
     virtual bool NextSetOfScans() = 0;
     virtual void BeginGetScan() = 0;

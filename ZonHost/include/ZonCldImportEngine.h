@@ -1,4 +1,5 @@
 #pragma once
+#include <functional>
 #include <memory>
 #include <string>
 #include <vector>
@@ -10,6 +11,10 @@
 #include "ZonMath.h"
 
 class ZonICloudReadFile;
+
+// Gives the display text of a statistics label ("Points", "Scans", ...). The
+// texts are the caller's: the engine looks up no catalog.
+using ZonCldStatLabeler = std::function<std::string(const std::string& key)>;
 
 // The host's cloud import engine: walks any reader through the reader
 // interfaces only, and builds the body's entities with the geometric factory.
@@ -30,15 +35,14 @@ class ZonICloudReadFile;
 //   point (text).
 //
 // `statistics` receives one line per count of what was created, labelled
-// with the "ZonCldImportBuild.StatWindow." texts. Errors raised by the reader
+// by `labeler` (by the bare key when it is empty); the note on triangles left
+// out is labelled the same way ("InvalidTriangles"). Errors raised by the reader
 // pass through unchanged; memory exhaustion raises the host's memory error.
 class ZON_HOST_API ZonCldImportEngine {
 public:
     static void InsertFile(ZonCldBody& body, ZonGeoFactoryProtected& factory,
                            const std::shared_ptr<ZonICloudReadFile>& reader, bool doublePrecision,
                            const ZonICkeUnit_var& unit, const ZonMathBox& box, double scale,
-                           std::vector<std::string>& messages, std::string& statistics, bool createTriangles);
-
-    // The statistics label of key ("Points", "Scans", ...), from the module's catalog.
-    static std::string StatLabel(const char* key);
+                           std::vector<std::string>& messages, std::string& statistics, bool createTriangles,
+                           const ZonCldStatLabeler& labeler = {});
 };

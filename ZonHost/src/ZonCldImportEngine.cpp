@@ -13,17 +13,20 @@
 #include "ZonICloudReadScanFile.h"
 #include "ZonBaseUnknown.h"
 #include "ZonCloudOperErrorTool.h"
-#include "ZonMsgCatalog.h"
 
 namespace {
-
-constexpr const char* StatCatalog = "ZonCloudImportExport";
 
 std::string Number(double value)
 {
     char buffer[64];
     const auto [end, ec] = std::to_chars(buffer, buffer + sizeof buffer, value);
     return ec == std::errc() ? std::string(buffer, end) : std::string("?");
+}
+
+// The caller's text for a statistics label; without a labeler the key itself.
+std::string Label(const ZonCldStatLabeler& labeler, const char* key)
+{
+    return labeler ? labeler(key) : std::string(key);
 }
 
 // Indices into `all` of the points of `kept`. A box query keeps points in
@@ -60,9 +63,9 @@ class Walker {
 public:
     Walker(ZonCldBody& body, ZonGeoFactoryProtected& factory, ZonICloudReadFile& reader,
            const std::shared_ptr<ZonICloudReadFile>& handle, const ZonMathBox& box, double factor,
-           bool createTriangles, std::vector<std::string>& messages)
+           bool createTriangles, std::vector<std::string>& messages, const ZonCldStatLabeler& labeler)
         : _body(body), _factory(factory), _reader(reader), _handle(handle), _box(box), _clip(!box.IsEmpty()),
-          _factor(factor), _createTriangles(createTriangles), _messages(messages)
+          _factor(factor), _createTriangles(createTriangles), _messages(messages), _labeler(labeler)
     {
     }
 
@@ -70,13 +73,13 @@ public:
     {
         _double = useDouble;
         switch (type) {
-            case 2:
+            case DigitizationScans:
                 if (auto scans = ZonQueryInterface<ZonICloudReadScanFile>(_handle)) return WalkScans(*scans);
                 break;
-            case 3:
+            case DigitizationGrids:
                 if (auto grids = ZonQueryInterface<ZonICloudReadGridFile>(_handle)) return WalkGrids(*grids);
                 break;
-            case 4:
+            case DigitizationPolygons:
                 if (auto polygons = ZonQueryInterface<ZonICloudReadPolygonFile>(_handle)) return WalkPolygons(*polygons);
                 break;
             default: break;
@@ -273,7 +276,7 @@ private:
             kept.insert(kept.end(), v, v + 3);
         }
         if (skipped > 0)
-            _messages.push_back(ZonCldImportEngine::StatLabel("InvalidTriangles") + ": " + std::to_string(skipped));
+            _messages.push_back(Label(_labeler, "InvalidTriangles") + ": " + std::to_string(skipped));
     }
 
     ZonCldBody& _body;
@@ -285,37 +288,38 @@ private:
     const double _factor;
     const bool _createTriangles;
     std::vector<std::string>& _messages;
+    const ZonCldStatLabeler& _labeler;
     bool _double = false;
 };
 
-void AddLine(std::string& text, const char* key, const std::string& value)
+void AddLine(std::string& text, const ZonCldStatLabeler& labeler, const char* key, const std::string& value)
 {
     text += "  ";
-    text += ZonCldImportEngine::StatLabel(key);
+    text += Label(labeler, key);
     text += ": ";
     text += value;
     text += '\n';
 }
 
-std::string Statistics(const ZonCldBody& body)
+std::string Statistics(const ZonCldBody& body, const ZonCldStatLabeler& labeler)
 {
     std::string text;
-    AddLine(text, "Points", std::to_string(body.GetNumberOfPoints()));
+    AddLine(text, labeler, "Points", std::to_string(body.GetNumberOfPoints()));
     if (!body.GetSetsOfScans().empty()) {
-        AddLine(text, "SetsOfScans", std::to_string(body.GetSetsOfScans().size()));
-        AddLine(text, "Scans", std::to_string(body.GetNumberOfScans()));
+        AddLine(text, labeler, "SetsOfScans", std::to_string(body.GetSetsOfScans().size()));
+        AddLine(text, labeler, "Scans", std::to_string(body.GetNumberOfScans()));
     }
-    if (!body.GetSetsOfGrids().empty()) AddLine(text, "Grids", std::to_string(body.GetNumberOfGrids()));
+    if (!body.GetSetsOfGrids().empty()) AddLine(text, labeler, "Grids", std::to_string(body.GetNumberOfGrids()));
     if (!body.GetPolygons().empty()) {
-        AddLine(text, "Polygons", std::to_string(body.GetPolygons().size()));
-        AddLine(text, "Triangles", std::to_string(body.GetNumberOfTriangles()));
+        AddLine(text, labeler, "Polygons", std::to_string(body.GetPolygons().size()));
+        AddLine(text, labeler, "Triangles", std::to_string(body.GetNumberOfTriangles()));
     }
-    AddLine(text, "Unit", body.GetUnitName());
+    AddLine(text, labeler, "Unit", body.GetUnitName());
     const ZonMathBox box = body.GetBox();
     if (!box.IsEmpty()) {
         const ZonMathPoint& low = box.GetLow();
         const ZonMathPoint& high = box.GetHigh();
-        AddLine(text, "Box",
+        AddLine(text, labeler, "Box",
                 Number(low[0]) + " " + Number(low[1]) + " " + Number(low[2]) + " / " + Number(high[0]) + " " +
                     Number(high[1]) + " " + Number(high[2]));
     }
@@ -324,15 +328,11 @@ std::string Statistics(const ZonCldBody& body)
 
 }  // namespace
 
-std::string ZonCldImportEngine::StatLabel(const char* key)
-{
-    return ZonMsgCatalog::Lookup(StatCatalog, std::string("ZonCldImportBuild.StatWindow.") + key);
-}
-
 void ZonCldImportEngine::InsertFile(ZonCldBody& body, ZonGeoFactoryProtected& factory,
                                     const std::shared_ptr<ZonICloudReadFile>& reader, bool doublePrecision,
                                     const ZonICkeUnit_var& unit, const ZonMathBox& box, double scale,
-                                    std::vector<std::string>& messages, std::string& statistics, bool createTriangles)
+                                    std::vector<std::string>& messages, std::string& statistics, bool createTriangles,
+                                    const ZonCldStatLabeler& labeler)
 {
     if (!reader) return;
     try {
@@ -347,8 +347,8 @@ void ZonCldImportEngine::InsertFile(ZonCldBody& body, ZonGeoFactoryProtected& fa
         body.SetTypeOfDigitization(type);
         body.SetUnitName(fileUnit ? fileUnit->Name() : "mm");
 
-        Walker(body, factory, *reader, reader, box, factor, createTriangles, messages).Walk(type, useDouble);
-        statistics = Statistics(body);
+        Walker(body, factory, *reader, reader, box, factor, createTriangles, messages, labeler).Walk(type, useDouble);
+        statistics = Statistics(body, labeler);
     } catch (const std::bad_alloc&) {
         ZonCloudOperErrorTool::ThrowInsufficientMemory();
     } catch (const std::length_error&) {

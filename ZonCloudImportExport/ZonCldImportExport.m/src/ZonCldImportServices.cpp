@@ -85,6 +85,12 @@ std::string CompleteStatistics(const std::string& engineText, const ZonUnicodeSt
     return text;
 }
 
+// The engine's statistics labels, from this module's catalog.
+std::string EngineLabel(const std::string& key)
+{
+    return ZonMsgCatalog::Lookup(ZonCloudReadNLSTool::Catalog(), "ZonCldImportBuild.StatWindow." + key);
+}
+
 // Mesh readers keep the format's triangles option for the importer; every
 // other reader's structure is taken whole.
 bool CreatesTriangles(const ZonICloudReadFile_var& reader)
@@ -130,7 +136,7 @@ std::shared_ptr<ZonCldBody> ZonCldImportServices::BuildCldBodyWithFormat(
     std::shared_ptr<ZonCldBody> body = factory.CreateCldBody();
     std::string engineText;
     ZonCldImportEngine::InsertFile(*body, factory, reader, doublePrecision, unit, box, scale, messages, engineText,
-                                   CreatesTriangles(reader));
+                                   CreatesTriangles(reader), EngineLabel);
     // Nothing in the file, or nothing in the part asked for.
     if (body->IsEmpty()) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_NoPointFound");
 
