@@ -116,7 +116,7 @@ void ZonCloudWriteAsciiUserFormat::Emit(const std::string& text)
         if (c == '\n') out += '\r';
         out += c;
     }
-    std::fwrite(out.data(), 1, out.size(), _file);
+    _file.Write(out.data(), out.size());
 }
 
 void ZonCloudWriteAsciiUserFormat::WriteHeader()
@@ -134,7 +134,7 @@ ZonHResult ZonCloudWriteAsciiUserFormat::BeginMultiWrite()
 
 ZonHResult ZonCloudWriteAsciiUserFormat::EndMultiWrite()
 {
-    if (_file && _rowSeparatorGiven) Emit(RowSeparatorLine() + "\n");
+    if (_file.IsOpen() && _rowSeparatorGiven) Emit(RowSeparatorLine() + "\n");
     return ZonCloudWriteFile::EndMultiWrite();
 }
 
@@ -162,7 +162,7 @@ void ZonCloudWriteAsciiUserFormat::BeginWritePoints(const unsigned& count)
 
 void ZonCloudWriteAsciiUserFormat::PointLine(double x, double y, double z, const unsigned char* rgb)
 {
-    if (!_file || _expected == 0) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_Failure");
+    if (!_file.IsOpen() || _expected == 0) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_Failure");
     if (_rowSeparatorGiven) Emit(_pointSeparator);
     const std::string& format = rgb ? _templateColor : _templatePlain;
     const int number = static_cast<int>(_total - _expected + 1);
@@ -198,12 +198,11 @@ void ZonCloudWriteAsciiUserFormat::WritePointColorDouble(const double xyz[3], co
 
 void ZonCloudWriteAsciiUserFormat::EndWritePoints()
 {
+    const bool complete = _expected == 0;
+    _expected = 0;
     if (!_multiWrite) {
-        if (_file && _rowSeparatorGiven) Emit(RowSeparatorLine() + "\n");
+        if (_file.IsOpen() && _rowSeparatorGiven) Emit(RowSeparatorLine() + "\n");
         CloseStream();
     }
-    if (_expected != 0) {
-        _expected = 0;
-        ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_Failure");
-    }
+    if (!complete) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_Failure");
 }

@@ -39,7 +39,7 @@ void ZonCloudWriteAsciiLibre::BeginWritePoints(const unsigned& count)
 
 void ZonCloudWriteAsciiLibre::CheckPointExpected()
 {
-    if (_expected == 0 || _kind != KindPoints || !_file)
+    if (_expected == 0 || _kind != KindPoints || !_file.IsOpen())
         ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_Failure");
 }
 
@@ -68,10 +68,10 @@ void ZonCloudWriteAsciiLibre::WritePointColorDouble(const double xyz[3], const u
 
 void ZonCloudWriteAsciiLibre::End(Kind kind)
 {
-    if (!_multiWrite) CloseStream();
     const bool complete = _expected == 0 && _kind == kind;
     _kind = KindNone;
     _expected = 0;
+    if (!_multiWrite) CloseStream();
     if (!complete) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_Failure");
 }
 
@@ -97,7 +97,7 @@ void ZonCloudWriteAsciiLibre::BeginWriteScans(const unsigned& count)
 
 void ZonCloudWriteAsciiLibre::CheckScanExpected()
 {
-    if (_expected == 0 || _kind != KindScans || !_file)
+    if (_expected == 0 || _kind != KindScans || !_file.IsOpen())
         ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_Failure");
 }
 
@@ -131,7 +131,7 @@ ZonHResult ZonCloudWriteAsciiLibre::BeginMultiWrite()
     Print("! Point Format           = 'X %%f Y %%f Z %%f'\n");
     Print("!\n");
     Print("! Total number of points = ");
-    _totalOffset = std::ftell(_file);
+    _totalOffset = _file.Tell();
     Print("%*s\n", TotalWidth, "");
     Print("!\n");
     _total = 0;
@@ -141,10 +141,13 @@ ZonHResult ZonCloudWriteAsciiLibre::BeginMultiWrite()
 
 ZonHResult ZonCloudWriteAsciiLibre::EndMultiWrite()
 {
-    if (_file && _totalOffset >= 0 && std::fseek(_file, _totalOffset, SEEK_SET) == 0)
-        Print("%-12d", static_cast<int>(_total));
-    CloseStream();
+    const std::uint32_t total = _total;
     _total = 0;
     _multiWrite = false;
+    if (_file.IsOpen()) {
+        _file.Seek(_totalOffset, SEEK_SET);
+        Print("%-12d", static_cast<int>(total));
+    }
+    CloseStream();
     return ZON_S_OK;
 }

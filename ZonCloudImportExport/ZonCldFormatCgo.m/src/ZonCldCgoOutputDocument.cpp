@@ -1,6 +1,5 @@
 #include "ZonCldCgoOutputDocument.h"
 
-#include "ZonCloudPrintFormat.h"
 #include "ZonObjectRegistry.h"
 
 namespace {
@@ -11,19 +10,21 @@ const ZonRegistration Registration("CLD_Cgo_OutputDocument", ZonIExchOutputDocum
 void ZonCldCgoOutputDocument::BeginFile()
 {
     // The count goes here on closing, when it is known.
-    ZonPrintFile(_stream, "            \n");
+    _output.Print("            \n");
     _count = 0;
 }
 
 void ZonCldCgoOutputDocument::WritePoint(double x, double y, double z, const unsigned char*)
 {
-    ZonPrintFile(_stream, "%f %f %f\n", x, y, z);
+    _output.Print("%f %f %f\n", x, y, z);
     ++_count;
 }
 
 void ZonCldCgoOutputDocument::EndFile()
 {
-    ZonPrintFile(_stream, "**end cloud**\n");
-    if (std::fseek(_stream, 0, SEEK_SET) == 0) ZonPrintFile(_stream, "%-12d", static_cast<int>(_count));
+    const std::uint64_t count = _count;
     _count = 0;
+    _output.Print("**end cloud**\n");
+    _output.Seek(0, SEEK_SET);
+    _output.Print("%-12d", static_cast<int>(count));
 }

@@ -21,13 +21,15 @@ ZonHResult ZonCloudWriteCgoAscii::BeginMultiWrite()
 
 ZonHResult ZonCloudWriteCgoAscii::EndMultiWrite()
 {
-    if (_file) {
-        Print("**end cloud**\n");
-        if (std::fseek(_file, 0, SEEK_SET) == 0) Print("%-12d", static_cast<int>(_total));
-    }
-    CloseStream();
+    const std::uint64_t total = _total;
     _multiWrite = false;
     _total = 0;
+    if (_file.IsOpen()) {
+        Print("**end cloud**\n");
+        _file.Seek(0, SEEK_SET);
+        Print("%-12d", static_cast<int>(total));
+    }
+    CloseStream();
     return ZON_S_OK;
 }
 
@@ -45,7 +47,7 @@ void ZonCloudWriteCgoAscii::BeginWritePoints(const unsigned& count)
 
 void ZonCloudWriteCgoAscii::PointLine(double x, double y, double z)
 {
-    if (!_file || _expected == 0) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_Failure");
+    if (!_file.IsOpen() || _expected == 0) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_Failure");
     Print("%f %f %f\n", x, y, z);
     --_expected;
 }
@@ -66,12 +68,11 @@ void ZonCloudWriteCgoAscii::WritePointColorDouble(const double xyz[3], const uns
 
 void ZonCloudWriteCgoAscii::EndWritePoints()
 {
-    if (!_multiWrite && _file) {
+    const bool complete = _expected == 0;
+    _expected = 0;
+    if (!_multiWrite && _file.IsOpen()) {
         Print("**end cloud**\n");
         CloseStream();
     }
-    if (_expected != 0) {
-        _expected = 0;
-        ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_Failure");
-    }
+    if (!complete) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_Failure");
 }

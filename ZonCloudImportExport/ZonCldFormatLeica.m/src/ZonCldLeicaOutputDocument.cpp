@@ -1,6 +1,5 @@
 #include "ZonCldLeicaOutputDocument.h"
 
-#include "ZonCloudPrintFormat.h"
 #include "ZonObjectRegistry.h"
 
 namespace {
@@ -11,7 +10,7 @@ const ZonRegistration Registration("CLD_AsciiRGB_OutputDocument", ZonIExchOutput
 void ZonCldLeicaOutputDocument::WritePoint(double x, double y, double z, const unsigned char* rgb)
 {
     if (rgb)
-        ZonPrintFile(_stream, "%f %f %f %d %d %d \n", x, y, z, rgb[0], rgb[1], rgb[2]);
+        _output.Print("%f %f %f %d %d %d \n", x, y, z, rgb[0], rgb[1], rgb[2]);
     else
-        ZonPrintFile(_stream, "%f %f %f\n", x, y, z);
+        _output.Print("%f %f %f\n", x, y, z);
 }

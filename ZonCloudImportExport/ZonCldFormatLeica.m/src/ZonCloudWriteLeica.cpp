@@ -21,7 +21,7 @@ void ZonCloudWriteLeica::BeginWritePoints(const unsigned& count)
 
 void ZonCloudWriteLeica::PointLine(double x, double y, double z, const unsigned char rgb[3])
 {
-    if (!_file || _expected == 0) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_Failure");
+    if (!_file.IsOpen() || _expected == 0) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_Failure");
     Print("%f %f %f %d %d %d\n", x, y, z, rgb[0], rgb[1], rgb[2]);
     --_expected;
 }
@@ -42,9 +42,8 @@ void ZonCloudWriteLeica::WritePointColorDouble(const double xyz[3], const unsign
 
 void ZonCloudWriteLeica::EndWritePoints()
 {
+    const bool complete = _expected == 0;
+    _expected = 0;
     if (!_multiWrite) CloseStream();
-    if (_expected != 0) {
-        _expected = 0;
-        ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_Failure");
-    }
+    if (!complete) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_Failure");
 }

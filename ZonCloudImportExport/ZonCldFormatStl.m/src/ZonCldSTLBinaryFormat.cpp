@@ -1,7 +1,7 @@
 #include "ZonCldSTLBinaryFormat.h"
 
 #include <bit>
-#include <cerrno>
+#include <cstdio>
 #include <cstring>
 #include <limits>
 
@@ -10,24 +10,6 @@
 static_assert(std::endian::native == std::endian::little, "STL output assumes a little-endian machine");
 
 namespace {
-
-[[noreturn]] void RaiseSystemError()
-{
-    if (errno == 0) errno = EIO;
-    ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, nullptr);
-}
-
-void Write(std::FILE* file, const void* data, std::size_t size)
-{
-    errno = 0;
-    if (!file || std::fwrite(data, 1, size, file) != size) RaiseSystemError();
-}
-
-void Seek(std::FILE* file, long offset, int whence)
-{
-    errno = 0;
-    if (!file || std::fseek(file, offset, whence) != 0) RaiseSystemError();
-}
 
 std::uint32_t Ordered(std::uint32_t value, bool reverseBytes) { return reverseBytes ? __builtin_bswap32(value) : value; }
 
@@ -41,35 +23,34 @@ std::array<char, ZonCldSTLBinaryFormat::HeaderSize> ZonCldSTLBinaryFormat::Heade
     return header;
 }
 
-void ZonCldSTLBinaryFormat::AnnounceTriangles(std::FILE* file, bool& headerPending, std::uint64_t count,
+void ZonCldSTLBinaryFormat::AnnounceTriangles(ZonCloudOutputFile& file, bool& headerPending, std::uint64_t count,
                                               bool reverseBytes)
 {
     if (count > std::numeric_limits<std::uint32_t>::max())
         ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_Failure");
     if (headerPending) {
         const auto header = Header();
-        Write(file, header.data(), header.size());
+        file.Write(header.data(), header.size());
         const std::uint32_t stored = Ordered(static_cast<std::uint32_t>(count), reverseBytes);
-        Write(file, &stored, sizeof stored);
+        file.Write(&stored, sizeof stored);
         headerPending = false;
         return;
     }
-    Seek(file, CountOffset, SEEK_SET);
+    file.Seek(CountOffset, SEEK_SET);
     std::uint32_t stored = 0;
-    errno = 0;
-    if (std::fread(&stored, sizeof stored, 1, file) != 1) RaiseSystemError();
+    file.Read(&stored, sizeof stored);
     const std::uint64_t total = Ordered(stored, reverseBytes) + count;
     // The count field holds 32 bits; a file past that could not be read back.
     if (total > std::numeric_limits<std::uint32_t>::max())
         ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_Failure");
     stored = Ordered(static_cast<std::uint32_t>(total), reverseBytes);
     // A stream opened for update needs a seek between reading and writing.
-    Seek(file, CountOffset, SEEK_SET);
-    Write(file, &stored, sizeof stored);
-    Seek(file, 0, SEEK_END);
+    file.Seek(CountOffset, SEEK_SET);
+    file.Write(&stored, sizeof stored);
+    file.Seek(0, SEEK_END);
 }
 
-void ZonCldSTLBinaryFormat::WriteFacet(std::FILE* file, const float normal[3], const float vertices[9],
+void ZonCldSTLBinaryFormat::WriteFacet(ZonCloudOutputFile& file, const float normal[3], const float vertices[9],
                                        bool reverseBytes)
 {
     unsigned char record[FacetSize] = {};
@@ -78,5 +59,5 @@ void ZonCldSTLBinaryFormat::WriteFacet(std::FILE* file, const float normal[3], c
     for (int i = 0; i < 9; ++i) words[3 + i] = std::bit_cast<std::uint32_t>(vertices[i]);
     for (auto& word : words) word = Ordered(word, reverseBytes);
     std::memcpy(record, words, sizeof words);  // the last two bytes stay 0
-    Write(file, record, sizeof record);
+    file.Write(record, sizeof record);
 }

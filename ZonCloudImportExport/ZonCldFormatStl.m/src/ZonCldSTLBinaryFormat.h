@@ -2,15 +2,15 @@
 #include <array>
 #include <cmath>
 #include <cstdint>
-#include <cstdio>
 
 #include "ZonCldExport.h"
+#include "ZonCloudOutputFile.h"
 
 // What the STL output document and the STL writer share: the binary layout
 // (80-byte header, 32-bit triangle count, 50-byte facet records), the header
 // text, the bookkeeping of the count over several announcements, and the
-// normal rule. Every failing write, read or seek raises type 3 with the
-// system's message.
+// normal rule. Every failing write, read or seek removes the file and raises
+// type 3 with the system's message (the output file's own checks).
 class ZON_CLD_API ZonCldSTLBinaryFormat {
 public:
     static constexpr std::size_t HeaderSize = 80;
@@ -25,10 +25,12 @@ public:
     // writes the header and the count and clears headerPending; each later
     // one reads the stored count back at offset 80, adds, rewrites it and
     // returns to the end of the file (the stream must be open for update).
-    static void AnnounceTriangles(std::FILE* file, bool& headerPending, std::uint64_t count, bool reverseBytes);
+    static void AnnounceTriangles(ZonCloudOutputFile& file, bool& headerPending, std::uint64_t count,
+                                  bool reverseBytes);
 
     // One facet record: normal, three vertices, attribute word 0.
-    static void WriteFacet(std::FILE* file, const float normal[3], const float vertices[9], bool reverseBytes);
+    static void WriteFacet(ZonCloudOutputFile& file, const float normal[3], const float vertices[9],
+                           bool reverseBytes);
 
     // n = (B - A) x (C - A), divided by its length unless that is zero.
     template <class T>

@@ -41,17 +41,18 @@ ZonHResult ZonCldSTLExporter::Export(const ZonIExchInputDocument_var& document, 
     if (ZonFailed(result)) return result;
     try {
         result = output->Write(document);
+        const ZonHResult closed = output->Close();
+        if (ZonFailed(result)) return result;
+        if (ZonFailed(closed)) return closed;
     } catch (ZonError& error) {
-        output->Close();
+        // The close that ends a broken file may fail too: the first error is the one to report.
+        try {
+            output->Close();
+        } catch (const ZonError&) {
+        }
         std::remove(fileName.c_str());
         ZonCloudReadNLSTool::FullReporterErrorList(&error);
         return ZON_E_FAIL;
     }
-    if (ZonFailed(result)) {
-        output->Close();
-        return result;
-    }
-    result = output->Close();
-    if (ZonFailed(result)) return result;
     return output->Release();
 }

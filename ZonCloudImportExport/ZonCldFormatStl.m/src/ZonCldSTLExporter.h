@@ -10,8 +10,9 @@ class ZON_CLD_API ZonCldSTLExporter : public ZonBaseUnknown, public ZonIExchExpo
 public:
     // Parameters read: "Precision" (empty or missing: "precUnknown"),
     // "Scaling" (passed on when present), "BinaryState" ("0", text, when
-    // the option control gave none). An error raised while writing is
-    // reported, the half-written target removed, and the failure returned.
+    // the option control gave none). An error raised while writing or
+    // closing is reported, the half-written target removed, and the failure
+    // returned.
     ZonHResult Export(const ZonIExchInputDocument_var& document, const ZonUnicodeString& fileName,
                       const Parameters& parameters) override;
 };

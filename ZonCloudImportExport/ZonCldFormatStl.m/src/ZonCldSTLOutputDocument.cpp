@@ -37,15 +37,6 @@ std::string ExpandAlias(const std::string& alias)
 
 }  // namespace
 
-ZonCldSTLOutputDocument::~ZonCldSTLOutputDocument() { CloseStream(); }
-
-void ZonCldSTLOutputDocument::CloseStream()
-{
-    if (!_stream) return;
-    std::fclose(_stream);
-    _stream = nullptr;
-}
-
 ZonHResult ZonCldSTLOutputDocument::SetFileName(const ZonUnicodeString& fileName)
 {
     _fileName = fileName;
@@ -72,11 +63,8 @@ ZonHResult ZonCldSTLOutputDocument::SetOptions(const ZonListValZonString& names,
 
 ZonHResult ZonCldSTLOutputDocument::Open()
 {
-    CloseStream();
-    if (_fileName.IsNull()) return ZON_E_FAIL;
     // Binary files are opened for update: each face rewrites the count.
-    _stream = std::fopen(_fileName.c_str(), _binary ? "w+b" : "wt");
-    if (!_stream) return ZON_E_FAIL;
+    if (!_output.Open(_fileName, _binary ? "w+b" : "wt")) return ZON_E_FAIL;
     _headerPending = _binary;
     return ZON_S_OK;
 }
@@ -85,8 +73,8 @@ ZonHResult ZonCldSTLOutputDocument::Write(const ZonIExchInputDocument_var& docum
 {
     if (!document) return ZON_E_FAIL;
     if (!_binary) {
-        if (!_stream) RaiseInput("No File");
-        ZonPrintFile(_stream, "solid %s \n", ExpandAlias(document->GetAliasName().ToUtf8()).c_str());
+        if (!_output.IsOpen()) RaiseInput("No File");
+        _output.Print("solid %s \n", ExpandAlias(document->GetAliasName().ToUtf8()).c_str());
     }
     if (document->HasRepresentation(ZonIExchProductStructure::RepresentationType)) {
         auto structure = ZonQueryInterface<ZonIExchProductStructure>(
@@ -221,8 +209,8 @@ void ZonCldSTLOutputDocument::WriteFacets(ZonIExchTessFace& face, const T* coord
             unsigned length = 0;
             if (face.GetFan(f, length) && length > 2) count += length - 2;
         }
-        if (!_stream) RaiseInput("No File");
-        ZonCldSTLBinaryFormat::AnnounceTriangles(_stream, _headerPending, count, _reverseBytes);
+        if (!_output.IsOpen()) RaiseInput("No File");
+        ZonCldSTLBinaryFormat::AnnounceTriangles(_output, _headerPending, count, _reverseBytes);
     }
 
     const std::uint64_t vertexCount = valueCount / 3;
@@ -265,7 +253,7 @@ void ZonCldSTLOutputDocument::WriteFacets(ZonIExchTessFace& face, const T* coord
 
 void ZonCldSTLOutputDocument::WriteFacet(const ZonMathPoint& a, const ZonMathPoint& b, const ZonMathPoint& c)
 {
-    if (!_stream) RaiseInput("No File");
+    if (!_output.IsOpen()) RaiseInput("No File");
     double vertices[9] = {a[0], a[1], a[2], b[0], b[1], b[2], c[0], c[1], c[2]};
     if (_scale != 1.0)
         for (double& value : vertices) value *= _scale;
@@ -275,22 +263,22 @@ void ZonCldSTLOutputDocument::WriteFacet(const ZonMathPoint& a, const ZonMathPoi
         float n[3], v[9];
         for (int i = 0; i < 3; ++i) n[i] = static_cast<float>(normal[i]);
         for (int i = 0; i < 9; ++i) v[i] = static_cast<float>(vertices[i]);
-        ZonCldSTLBinaryFormat::WriteFacet(_stream, n, v, _reverseBytes);
+        ZonCldSTLBinaryFormat::WriteFacet(_output, n, v, _reverseBytes);
         return;
     }
-    ZonPrintFile(_stream, "  facet normal %e %e %e\n", normal[0], normal[1], normal[2]);
-    ZonPrintFile(_stream, "    outer loop\n");
+    _output.Print("  facet normal %e %e %e\n", normal[0], normal[1], normal[2]);
+    _output.Print("    outer loop\n");
     for (int i = 0; i < 3; ++i)
-        ZonPrintFile(_stream, "      vertex %e %e %e\n", vertices[3 * i], vertices[3 * i + 1], vertices[3 * i + 2]);
-    ZonPrintFile(_stream, "    endloop\n");
-    ZonPrintFile(_stream, "  endfacet\n");
+        _output.Print("      vertex %e %e %e\n", vertices[3 * i], vertices[3 * i + 1], vertices[3 * i + 2]);
+    _output.Print("    endloop\n");
+    _output.Print("  endfacet\n");
 }
 
 ZonHResult ZonCldSTLOutputDocument::Close()
 {
-    if (!_stream) return ZON_S_OK;
-    if (!_binary) ZonPrintFile(_stream, "endsolid\n");
-    CloseStream();
+    if (!_output.IsOpen()) return ZON_S_OK;
+    if (!_binary) _output.Print("endsolid\n");
+    _output.Close();
     return ZON_S_OK;
 }
 
@@ -318,6 +306,7 @@ int ZonCldSTLOutputDocument::GetOutcomeLevel() const
 ZonHResult ZonCldSTLOutputDocument::Release()
 {
     Close();
+    if (_output.HasFailed()) return ZON_E_FAIL;
     if (!_meshFound && !_fileName.IsNull()) std::remove(_fileName.c_str());
     const char* code = GetOutcomeCode();
     if (!code) return ZON_S_OK;

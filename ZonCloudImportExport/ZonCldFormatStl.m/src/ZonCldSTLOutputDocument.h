@@ -1,9 +1,9 @@
 #pragma once
-#include <cstdio>
 #include <string>
 
 #include "ZonBaseUnknown.h"
 #include "ZonCldExport.h"
+#include "ZonCloudOutputFile.h"
 #include "ZonIExchOutputDocument.h"
 #include "ZonIExchProduct.h"
 #include "ZonIExchTessRep.h"
@@ -14,11 +14,12 @@
 // Product structures are walked through their instances, composing the
 // placements; tessellated nodes give their faces, whose separate triangles,
 // strips and fans become facets. Clouds, scans and grids cannot go into a
-// mesh file: they are noted and reported on release.
+// mesh file: they are noted and reported on release. A write or close that
+// fails removes the file and raises the system's error.
 class ZON_CLD_API ZonCldSTLOutputDocument : public ZonBaseUnknown, public ZonIExchOutputDocument {
 public:
     ZonCldSTLOutputDocument() = default;
-    ~ZonCldSTLOutputDocument() override;
+    ~ZonCldSTLOutputDocument() override = default;
     ZonCldSTLOutputDocument(const ZonCldSTLOutputDocument&) = delete;
     ZonCldSTLOutputDocument& operator=(const ZonCldSTLOutputDocument&) = delete;
 
@@ -30,7 +31,8 @@ public:
     ZonHResult Open() override;
     ZonHResult Write(const ZonIExchInputDocument_var& document) override;
     ZonHResult Close() override;
-    // Deletes the target when no mesh was met, then reports the outcome.
+    // Deletes the target when no mesh was met, then reports the outcome; a
+    // file lost to a failed write reports nothing and fails.
     ZonHResult Release() override;
 
     // The outcome Release reports: the code after "ZonCldExportCmd." and its
@@ -55,10 +57,9 @@ private:
     void WriteFacets(ZonIExchTessFace& face, const T* coords, unsigned valueCount,
                      const ZonMathTransformation& placement);
     void WriteFacet(const ZonMathPoint& a, const ZonMathPoint& b, const ZonMathPoint& c);
-    void CloseStream();
 
     ZonUnicodeString _fileName;
-    std::FILE* _stream = nullptr;
+    ZonCloudOutputFile _output;
     bool _binary = true;
     bool _headerPending = true;
     bool _reverseBytes = false;  // never set here; the layout allows it

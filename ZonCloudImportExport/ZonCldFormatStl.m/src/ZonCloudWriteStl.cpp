@@ -17,7 +17,7 @@ ZonHResult ZonCloudWriteStl::BeginMultiWrite()
 
 void ZonCloudWriteStl::BeginWriteTriangles(const unsigned& count)
 {
-    if (!_file) {
+    if (!_file.IsOpen()) {
         // Opened for update: a later announcement reads the count back.
         OpenStream("w+b");
         _headerPending = true;
@@ -28,7 +28,7 @@ void ZonCloudWriteStl::BeginWriteTriangles(const unsigned& count)
 
 void ZonCloudWriteStl::WriteTriangle(const float vertices[9])
 {
-    if (!_file) {
+    if (!_file.IsOpen()) {
         errno = EBADF;
         ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, nullptr);
     }
@@ -43,5 +43,9 @@ void ZonCloudWriteStl::EndWriteTriangles()
 {
     const bool complete = _expected == 0;
     _expected = 0;
+    // The file stays open for the next announcement; what is written so far
+    // must reach the disk now, as the destructor that closes it
+    // cannot report a loss.
+    if (_file.IsOpen()) _file.Flush();
     if (!complete) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_Failure");
 }

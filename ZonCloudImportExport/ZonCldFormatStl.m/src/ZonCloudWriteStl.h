@@ -21,7 +21,8 @@ public:
     void BeginWriteTriangles(const unsigned& count) override;
     // Nine floats: the three vertices' x, y, z.
     void WriteTriangle(const float vertices[9]) override;
-    // Raises "ERR_Failure" when announced triangles were not all written.
+    // Raises "ERR_Failure" when announced triangles were not all written, and
+    // the system's error when the triangles cannot be flushed to the file.
     void EndWriteTriangles() override;
 
 private:

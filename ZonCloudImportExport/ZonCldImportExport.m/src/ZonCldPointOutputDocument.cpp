@@ -5,15 +5,6 @@
 #include "ZonExchPointWalker.h"
 #include "ZonIReporter.h"
 
-ZonCldPointOutputDocument::~ZonCldPointOutputDocument() { CloseStream(); }
-
-void ZonCldPointOutputDocument::CloseStream()
-{
-    if (!_stream) return;
-    std::fclose(_stream);
-    _stream = nullptr;
-}
-
 ZonHResult ZonCldPointOutputDocument::SetFileName(const ZonUnicodeString& fileName)
 {
     _fileName = fileName;
@@ -33,10 +24,7 @@ ZonHResult ZonCldPointOutputDocument::SetOptions(const ZonListValZonString& name
 
 ZonHResult ZonCldPointOutputDocument::Open()
 {
-    CloseStream();
-    if (_fileName.IsNull()) return ZON_E_FAIL;
-    _stream = std::fopen(_fileName.c_str(), "w");
-    if (!_stream) return ZON_E_FAIL;
+    if (!_output.Open(_fileName, "w")) return ZON_E_FAIL;
     BeginFile();
     return ZON_S_OK;
 }
@@ -44,7 +32,7 @@ ZonHResult ZonCldPointOutputDocument::Open()
 ZonHResult ZonCldPointOutputDocument::Write(const ZonIExchInputDocument_var& document)
 {
     if (!document) return ZON_E_FAIL;
-    if (!_stream) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Input, "No File");
+    if (!_output.IsOpen()) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Input, "No File");
     const double scale = _scale != 0.0 ? _scale : 1.0;
     const bool read = ZonExchPointWalker::Walk(*document, _readDouble, [&](const ZonMathPoint& p, const unsigned char* rgb) {
         WritePoint(p[0] * scale, p[1] * scale, p[2] * scale, rgb);
@@ -55,14 +43,15 @@ ZonHResult ZonCldPointOutputDocument::Write(const ZonIExchInputDocument_var& doc
 
 ZonHResult ZonCldPointOutputDocument::Close()
 {
-    if (_stream) EndFile();
-    CloseStream();
+    if (_output.IsOpen()) EndFile();
+    _output.Close();
     return ZON_S_OK;
 }
 
 ZonHResult ZonCldPointOutputDocument::Release()
 {
     Close();
+    if (_output.HasFailed()) return ZON_E_FAIL;
     ZonSession* session = ZonSession::GetPtrSession();
     const ZonIReporter_var reporter = session ? session->GetReporter() : nullptr;
     if (!reporter) return ZON_S_OK;

@@ -1,19 +1,20 @@
 #pragma once
 #include <cstdint>
-#include <cstdio>
 
 #include "ZonBaseUnknown.h"
 #include "ZonCldExport.h"
+#include "ZonCloudOutputFile.h"
 #include "ZonIExchOutputDocument.h"
 
 // Base of the output documents that write the points of an exchange document
 // as a text file, one line per point: each point is placed by its
 // representation's transformation and multiplied by the export scale factor
 // (unless that is 0). A format writes its own lines and what comes before and
-// after them.
+// after them. A write or close that fails removes the file and raises the
+// system's error; the document then reports no outcome.
 class ZON_CLD_API ZonCldPointOutputDocument : public ZonBaseUnknown, public ZonIExchOutputDocument {
 public:
-    ~ZonCldPointOutputDocument() override;
+    ~ZonCldPointOutputDocument() override = default;
     ZonCldPointOutputDocument(const ZonCldPointOutputDocument&) = delete;
     ZonCldPointOutputDocument& operator=(const ZonCldPointOutputDocument&) = delete;
 
@@ -24,7 +25,8 @@ public:
     ZonHResult Open() override;
     ZonHResult Write(const ZonIExchInputDocument_var& document) override;
     ZonHResult Close() override;
-    // Reports "ERR_FILESUCCESSFULL", or "ERR_NoActivePoints" when no point was written.
+    // Reports "ERR_FILESUCCESSFULL", or "ERR_NoActivePoints" when no point
+    // was written; a file lost to a failed write reports nothing and fails.
     ZonHResult Release() override;
 
     std::uint64_t GetPointsWritten() const { return _written; }
@@ -39,11 +41,9 @@ protected:
     // What comes after the points, the file still open.
     virtual void EndFile() {}
 
-    std::FILE* _stream = nullptr;
+    ZonCloudOutputFile _output;
 
 private:
-    void CloseStream();
-
     ZonUnicodeString _fileName;
     double _scale = 1.0;
     bool _readDouble = false;

@@ -19,8 +19,11 @@
 ZON_CLD_API int ZonPrintV(std::string& out, const char* format, std::va_list args);
 ZON_CLD_API int ZonPrint(std::string& out, const char* format, ...) __attribute__((format(printf, 2, 3)));
 // fprintf counterpart: returns the number of characters written, or -1 when
-// the stream refused them.
-ZON_CLD_API int ZonPrintFile(std::FILE* file, const char* format, ...) __attribute__((format(printf, 2, 3)));
-ZON_CLD_API int ZonPrintFileV(std::FILE* file, const char* format, std::va_list args);
+// the stream refused them (errno tells why). A refusal is how a full disk
+// shows, so the result must be looked at; writers go through
+// ZonCloudOutputFile, which does.
+[[nodiscard]] ZON_CLD_API int ZonPrintFile(std::FILE* file, const char* format, ...)
+    __attribute__((format(printf, 2, 3)));
+[[nodiscard]] ZON_CLD_API int ZonPrintFileV(std::FILE* file, const char* format, std::va_list args);
 // The formatted text as a string.
 ZON_CLD_API std::string ZonFormat(const char* format, ...) __attribute__((format(printf, 1, 2)));

@@ -2,7 +2,6 @@
 
 #include <cstdarg>
 
-#include "ZonCloudPrintFormat.h"
 #include "ZonCloudReadNLSTool.h"
 #include "ZonICloudWritePointFile.h"
 #include "ZonICloudWritePolygonFile.h"
@@ -16,8 +15,6 @@ ZonICloudWritePolygonFile::~ZonICloudWritePolygonFile() = default;
 
 ZonCloudWriteFile::ZonCloudWriteFile(const ZonUnicodeString& fileName) : _fileName(fileName) {}
 
-ZonCloudWriteFile::~ZonCloudWriteFile() { CloseStream(); }
-
 void ZonCloudWriteFile::GetFileName(ZonUnicodeString& name) { name = _fileName; }
 
 ZonHResult ZonCloudWriteFile::BeginMultiWrite()
@@ -29,34 +26,22 @@ ZonHResult ZonCloudWriteFile::BeginMultiWrite()
 
 ZonHResult ZonCloudWriteFile::EndMultiWrite()
 {
-    CloseStream();
     _multiWrite = false;
+    CloseStream();
     return ZON_S_OK;
 }
 
-bool ZonCloudWriteFile::TryOpenStream(const char* mode)
-{
-    CloseStream();
-    _file = std::fopen(_fileName.c_str(), mode);
-    return _file != nullptr;
-}
+bool ZonCloudWriteFile::TryOpenStream(const char* mode) { return _file.Open(_fileName, mode); }
 
 void ZonCloudWriteFile::OpenStream(const char* mode)
 {
     if (!TryOpenStream(mode)) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, nullptr);
 }
 
-void ZonCloudWriteFile::CloseStream()
-{
-    if (!_file) return;
-    std::fclose(_file);
-    _file = nullptr;
-}
-
 void ZonCloudWriteFile::Print(const char* format, ...)
 {
     std::va_list args;
     va_start(args, format);
-    ZonPrintFileV(_file, format, args);
+    _file.PrintV(format, args);
     va_end(args);
 }

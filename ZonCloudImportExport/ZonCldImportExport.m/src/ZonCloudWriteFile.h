@@ -1,18 +1,19 @@
 #pragma once
-#include <cstdio>
-
 #include "ZonBaseUnknown.h"
 #include "ZonCldExport.h"
+#include "ZonCloudOutputFile.h"
 #include "ZonICloudWriteFile.h"
 
-// Base of every writer: the file name, the output stream it owns (closed by
+// Base of every writer: the file name, the output file it owns (closed by
 // the destructor at the latest), the multi-part flag and the byte order of
 // binary output. Text goes through Print, which writes '.' as decimal point
-// whatever the process locale, so files read back everywhere.
+// whatever the process locale, so files read back everywhere. Every write
+// and the close are checked: a failure removes the file and raises the
+// system's error (see ZonCloudOutputFile).
 class ZON_CLD_API ZonCloudWriteFile : public ZonBaseUnknown, public ZonICloudWriteFile {
 public:
     explicit ZonCloudWriteFile(const ZonUnicodeString& fileName);
-    ~ZonCloudWriteFile() override;
+    ~ZonCloudWriteFile() override = default;
     ZonCloudWriteFile(const ZonCloudWriteFile&) = delete;
     ZonCloudWriteFile& operator=(const ZonCloudWriteFile&) = delete;
 
@@ -21,7 +22,9 @@ public:
     void SetWriteSettings(const ZonListValZonString&) override {}
     void GetWriteSettings(ZonListValZonString&) override {}
     // By default a multi-part file is simply kept open between the pieces;
-    // writers whose headers carry totals complete them in EndMultiWrite.
+    // writers whose headers carry totals complete them in EndMultiWrite. A
+    // file that cannot be completed raises rather than returning a failure,
+    // as any other write does.
     ZonHResult BeginMultiWrite() override;
     ZonHResult EndMultiWrite() override;
     void SetReverseByteOrder(bool reversed) override { _reverseBytes = reversed; }
@@ -35,14 +38,13 @@ protected:
     void OpenStream(const char* mode);
     // The same without raising: false when the file cannot be opened.
     bool TryOpenStream(const char* mode);
-    void CloseStream();
+    void CloseStream() { _file.Close(); }
 
-    // fprintf to the stream with '.' as decimal point. Individual lines are
-    // not checked: a full disk shows when the stream is closed.
+    // fprintf to the file with '.' as decimal point.
     void Print(const char* format, ...) __attribute__((format(printf, 2, 3)));
 
     ZonUnicodeString _fileName;
-    FILE* _file = nullptr;
+    ZonCloudOutputFile _file;
     bool _multiWrite = false;
     bool _reverseBytes = false;
 };
