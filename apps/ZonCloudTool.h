@@ -8,11 +8,38 @@
 #include <CLI/CLI.hpp>
 #include <nlohmann/json.hpp>
 
+#include "ZonCloudSetting.h"
 #include "ZonError.h"
 #include "ZonICloudReadFile.h"
 
 class ZonCldBody;
 class ZonGeoFactoryProtected;
+
+// Offers the settings that formats declare as command-line options and writes
+// the ones given into the settings store, knowing no format. Settings that
+// share an option name make one option; a setting without one is not offered.
+class ZonToolSettingOptions {
+public:
+    // Adds the options not added yet.
+    void AddTo(CLI::App& command, const std::vector<ZonCloudSetting>& settings);
+    void ApplyToSettings() const;
+
+private:
+    struct Entry {
+        std::vector<ZonCloudSetting> settings;  // one per key, in the order of the values
+        CLI::Option* option = nullptr;
+        bool flag = false;
+        int integer = 0;
+        double number = 0;
+        std::string text;
+        std::vector<std::string> texts;
+    };
+    std::vector<std::unique_ptr<Entry>> _entries;  // the options hold addresses into them
+};
+
+// What the registered reader factories and exporters declare.
+std::vector<ZonCloudSetting> ZonToolReaderSettings();
+std::vector<ZonCloudSetting> ZonToolExporterSettings();
 
 // Reader options shared by the commands that read a file. Format options reach
 // the readers through the settings store, as in the interactive import.
@@ -21,13 +48,8 @@ struct ZonToolReaderOptions {
     std::string format;  // skips the choice by extension
     std::optional<double> sampling;
     bool doublePrecision = false;
-    std::vector<std::string> delimiters;  // begin, end
-    std::optional<int> direction;
     std::vector<double> box;  // xmin ymin zmin xmax ymax zmax
-    std::string byteOrder;    // unknown | current | differ
-    std::string fdf;
-    bool noColors = false;
-    bool noTriangles = false;
+    ZonToolSettingOptions formatOptions;
 
     void AddTo(CLI::App& command);
     // Writes the options into the settings store.

@@ -20,14 +20,8 @@ void ZonToolReaderOptions::AddTo(CLI::App& command)
             "FORMAT");
     command.add_option("--sampling", sampling, "Sampling percent, 0 to 100");
     command.add_flag("--double", doublePrecision, "Read in double precision");
-    command.add_option("--delimiters", delimiters, "Begin and end scan delimiters")->expected(2);
-    command.add_option("--direction", direction, "Scan direction: 0 unknown, 1 one way, 2 zigzag");
     command.add_option("--box", box, "XMIN YMIN ZMIN XMAX YMAX ZMAX")->expected(6);
-    command.add_option("--byte-order", byteOrder, "Byte order of binary files")
-        ->check(CLI::IsMember({"unknown", "current", "differ"}));
-    command.add_option("--fdf", fdf, "Format description file");
-    command.add_flag("--no-colors", noColors, "Do not keep the points' colours");
-    command.add_flag("--no-triangles", noTriangles, "Import the vertices of meshes only");
+    formatOptions.AddTo(command, ZonToolReaderSettings());
 }
 
 void ZonToolReaderOptions::ApplyToSettings() const
@@ -35,22 +29,7 @@ void ZonToolReaderOptions::ApplyToSettings() const
     auto& settings = ZonCldSettings::Instance();
     if (sampling) settings.SetImportSampling(*sampling);
     settings.SetImportDoublePrecision(doublePrecision);
-    if (delimiters.size() == 2) {
-        settings.SetValue("StartDelimitor", delimiters[0]);
-        settings.SetValue("EndDelimitor", delimiters[1]);
-    }
-    if (direction) settings.SetInt("ScanDirection", *direction);
-    if (!byteOrder.empty())
-        settings.SetInt("BinaryFrom", byteOrder == "unknown" ? 0 : byteOrder == "current" ? 1 : 2);
-    if (!fdf.empty()) settings.SetImportAUFFDF(fdf);
-    if (noColors) settings.SetBool("KeepColors", false);
-    if (noTriangles) {
-        settings.SetImportSTLFacets(false);
-        settings.SetImportGoCadFacets(false);
-        settings.SetImportArcInfoGridFacets(false);
-        settings.SetImportSRTMFacets(false);
-        settings.SetBool("CreateTriangles", false);
-    }
+    formatOptions.ApplyToSettings();
 }
 
 ZonMathBox ZonToolReaderOptions::Box() const

@@ -189,7 +189,7 @@ TEST_F(AsciiUserFormat, SamplingAndCapacity)
 TEST_F(AsciiUserFormat, FactoryTakesTheFdfAndColourChoiceFromTheSettings)
 {
     auto& settings = ZonCldSettings::Instance();
-    settings.SetImportAUFFDF(Write("columns.fdf", "X Y Z R G B"));
+    settings.SetValue("ImportAUFFDF", Write("columns.fdf", "X Y Z R G B"));
     settings.SetBool("KeepColors", false);
     const auto reader = ZonCloudFactoryAsciiUserFormat().CreateReader(Write("data.asc_fmt", "1 2 3 4 5 6\r\n"));
     settings.ResetAll();

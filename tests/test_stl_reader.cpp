@@ -295,7 +295,7 @@ TEST_F(StlReaderTest, FactoryAppliesTheSettings)
 {
     auto& settings = ZonCldSettings::Instance();
     settings.SetInt("BinaryFrom", 2);
-    settings.SetImportSTLFacets(false);
+    settings.SetBool("ImportSTLFacets", false);
     settings.SetBool("CreateFreeEdges", true);
     auto reader = ZonCldImporter::GetFactory(ZonUnicodeString("STL"))->CreateReader(ZonUnicodeString(Path("any.stl")));
     settings.ResetAll();

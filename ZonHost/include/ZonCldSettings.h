@@ -7,8 +7,9 @@
 #include "ZonHostExport.h"
 
 // The host's settings store for cloud import and export. Every entry is a
-// named text; the typed accessors below are the ones the formats read, with
-// their defaults. Readers get their options from here through their factory.
+// named text; the typed accessors below are the import entry's, with their
+// defaults. Each format declares and reads its own keys (readers through
+// their factory, writers through their exporter).
 class ZON_HOST_API ZonCldSettings {
 public:
     static ZonCldSettings& Instance();
@@ -36,18 +37,6 @@ public:
     void SetImportFileUnit(const std::string& v) { SetValue("ImportFileUnit", v); }
     bool GetImportDoublePrecision() const { return GetBool("ImportDoublePrecision", false); }
     void SetImportDoublePrecision(bool v) { SetBool("ImportDoublePrecision", v); }
-
-    // Format options.
-    bool GetImportSTLFacets() const { return GetBool("ImportSTLFacets", true); }
-    void SetImportSTLFacets(bool v) { SetBool("ImportSTLFacets", v); }
-    bool GetImportGoCadFacets() const { return GetBool("ImportGoCadFacets", true); }
-    void SetImportGoCadFacets(bool v) { SetBool("ImportGoCadFacets", v); }
-    bool GetImportArcInfoGridFacets() const { return GetBool("ImportArcInfoGridFacets", true); }
-    void SetImportArcInfoGridFacets(bool v) { SetBool("ImportArcInfoGridFacets", v); }
-    bool GetImportSRTMFacets() const { return GetBool("ImportSRTMFacets", true); }
-    void SetImportSRTMFacets(bool v) { SetBool("ImportSRTMFacets", v); }
-    std::string GetImportAUFFDF() const { return GetString("ImportAUFFDF", ""); }
-    void SetImportAUFFDF(const std::string& v) { SetValue("ImportAUFFDF", v); }
 
 private:
     mutable std::mutex mutex_;

@@ -1,21 +1,28 @@
 #include "ZonCloudFactoryAsciiUserFormat.h"
 
-#include "ZonCldSettings.h"
 #include "ZonCloudReadAsciiUserFormat.h"
 
 ZON_REGISTER_CLOUD_FACTORY(ZonCloudFactoryAsciiUserFormat, "CloudFactoryAsciiUserFormat")
 
+namespace {
+using Kind = ZonCloudSetting::Kind;
+const ZonCloudSetting FDFile{.key = "ImportAUFFDF", .option = "fdf", .help = "Format description file"};
+const ZonCloudSetting KeepColors{.key = "KeepColors", .option = "no-colors", .kind = Kind::Flag, .fallback = "1",
+                                 .help = "Do not keep the points' colours", .given = "0"};
+const ZonCloudSetting Settings[] = {FDFile, KeepColors};
+}  // namespace
+
 ZonCloudFactoryAsciiUserFormat::ZonCloudFactoryAsciiUserFormat()
-    : ZonCloudReadFileFactory({"CloudFactoryAsciiUserFormat", "ASCII User Format", "*.asc_fmt", true, false, true})
+    : ZonCloudReadFileFactory(
+          {"CloudFactoryAsciiUserFormat", "ASCII User Format", "*.asc_fmt", true, false, true, Settings})
 {
 }
 
 ZonICloudReadFile_var ZonCloudFactoryAsciiUserFormat::CreateReader(const ZonUnicodeString& fileName)
 {
-    const ZonCldSettings& settings = ZonCldSettings::Instance();
     auto reader = std::make_shared<ZonCloudReadAsciiUserFormat>(fileName);
-    reader->SetKeepColors(settings.GetBool("KeepColors", true));
-    reader->SetFDFile(ZonUnicodeString(settings.GetImportAUFFDF()));
+    reader->SetKeepColors(KeepColors.ReadBool());
+    reader->SetFDFile(ZonUnicodeString(FDFile.Read()));
     return reader;
 }
 

@@ -3,20 +3,26 @@
 #include <charconv>
 #include <string>
 
-#include "ZonCldSettings.h"
 #include "ZonCloudReadLeica.h"
 
 ZON_REGISTER_CLOUD_FACTORY(ZonCloudFactoryLeica, "CloudFactoryLeica")
 
+namespace {
+const ZonCloudSetting KeepColors{.key = ZonCloudFactoryLeica::OptionKeepColors, .option = "no-colors",
+                                 .kind = ZonCloudSetting::Kind::Flag, .fallback = "1",
+                                 .help = "Do not keep the points' colours", .given = "0"};
+const ZonCloudSetting Settings[] = {KeepColors};
+}  // namespace
+
 ZonCloudFactoryLeica::ZonCloudFactoryLeica()
-    : ZonCloudReadFileFactory({"CloudFactoryLeica", "Ascii RGB", "*.asc_rgb;*.xyz_rgb", true, false, true})
+    : ZonCloudReadFileFactory({"CloudFactoryLeica", "Ascii RGB", "*.asc_rgb;*.xyz_rgb", true, false, true, Settings})
 {
 }
 
 ZonICloudReadFile_var ZonCloudFactoryLeica::CreateReader(const ZonUnicodeString& fileName)
 {
     auto reader = std::make_shared<ZonCloudReadLeica>(fileName);
-    reader->SetKeepColors(ZonCldSettings::Instance().GetBool(OptionKeepColors, true));
+    reader->SetKeepColors(KeepColors.ReadBool());
     return reader;
 }
 

@@ -1,12 +1,14 @@
 #pragma once
 #include "ZonBaseUnknown.h"
 #include "ZonCldExport.h"
+#include "ZonCloudSetting.h"
 #include "ZonICloudReadFileFactory.h"
 #include "ZonObjectRegistry.h"
 
 // Common part of the format factories: each passes its registry name, format
 // name (empty when the name comes from the catalog), filter and abilities, and
 // implements CreateReader, applying its format's settings to the new reader.
+// A factory declares the settings it reads, so front ends can offer them.
 class ZON_CLD_API ZonCloudReadFileFactory : public ZonBaseUnknown, public ZonICloudReadFileFactory {
 public:
     struct Description {
@@ -16,6 +18,7 @@ public:
         bool withSampling;
         bool withLengthUnit;
         bool withOptions;
+        ZonCloudSettings settings = {};
     };
     explicit ZonCloudReadFileFactory(const Description& description) : _description(description) {}
 
@@ -25,6 +28,7 @@ public:
     void IsWithLengthUnit(bool& answer) override { answer = _description.withLengthUnit; }
     void IsWithOptions(bool& answer) override { answer = _description.withOptions; }
     const char* GetRegistryName() override { return _description.registryName; }
+    ZonCloudSettings GetSettings() const { return _description.settings; }
 
 private:
     Description _description;
