@@ -7,10 +7,7 @@
 #include <new>
 #include <type_traits>
 
-#include <sys/stat.h>
-
 #include "DecimalPointGuard.h"
-#include "ZonCloudOperErrorTool.h"
 #include "ZonCloudReadNLSTool.h"
 #include "ZonCloudSampler.h"
 
@@ -22,30 +19,13 @@ constexpr int kMaxUnknownInSearch = 100;
 constexpr int kMaxUnknownInARow = 100;
 constexpr int kMaxUnknownInAll = 300;
 
+// Callers run inside Guarded, which turns a failed allocation into the memory error.
 template <class T>
-void PushOrThrow(std::vector<T>& v, const double xyz[3])
+void Push(std::vector<T>& v, const double xyz[3])
 {
-    try {
-        v.push_back(static_cast<T>(xyz[0]));
-        v.push_back(static_cast<T>(xyz[1]));
-        v.push_back(static_cast<T>(xyz[2]));
-    } catch (const std::bad_alloc&) {
-        ZonCloudOperErrorTool::ThrowInsufficientMemory();
-    } catch (const std::length_error&) {
-        ZonCloudOperErrorTool::ThrowInsufficientMemory();
-    }
-}
-
-template <class T>
-void ReserveOrThrow(std::vector<T>& v, std::size_t n)
-{
-    try {
-        v.reserve(n);
-    } catch (const std::bad_alloc&) {
-        ZonCloudOperErrorTool::ThrowInsufficientMemory();
-    } catch (const std::length_error&) {
-        ZonCloudOperErrorTool::ThrowInsufficientMemory();
-    }
+    v.push_back(static_cast<T>(xyz[0]));
+    v.push_back(static_cast<T>(xyz[1]));
+    v.push_back(static_cast<T>(xyz[2]));
 }
 
 // A first guess of the points a percent keeps; scans keep their first points on top.
@@ -62,6 +42,18 @@ void Free(std::vector<T>& v)
     v.clear();
     v.shrink_to_fit();
 }
+
+// The line buffer is kept only while a pass reads; this gives it back however the pass ends.
+class ReleasedAtEnd {
+public:
+    explicit ReleasedAtEnd(ZonCloudLineSource& lines) : _lines(lines) {}
+    ~ReleasedAtEnd() { _lines.Release(); }
+    ReleasedAtEnd(const ReleasedAtEnd&) = delete;
+    ReleasedAtEnd& operator=(const ReleasedAtEnd&) = delete;
+
+private:
+    ZonCloudLineSource& _lines;
+};
 
 }  // namespace
 
@@ -90,9 +82,10 @@ void ZonCloudReadAsciiLibre::ResetAnalysis()
 
 void ZonCloudReadAsciiLibre::AnalyseFile()
 {
-    OpenFile();
-    struct stat info {};
-    const std::int64_t fileSize = fstat(fileno(_file), &info) == 0 ? static_cast<std::int64_t>(info.st_size) : 0;
+    ZonCloudByteSource& source = Source();
+    // Nothing of an earlier pass (a scan walk before new delimiters) is reused.
+    _lines.Release();
+    const ReleasedAtEnd released(_lines);
 
     DecimalPointGuard guard;
     double low[3];
@@ -101,17 +94,10 @@ void ZonCloudReadAsciiLibre::AnalyseFile()
         // A file that cannot be read one way is tried once with the other decimal point.
         auto retryOrRaise = [&](const char* code) {
             if (attempt == 0 && guard.Switch()) return;
-            CloseFile();
-            _lines.Release();
             ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, code);
         };
         ResetAnalysis();
-        try {
-            _lines.Start(_file, 0);
-        } catch (...) {
-            CloseFile();
-            throw;
-        }
+        _lines.Start(source, 0);
         const Pass search = SearchFormat(guard.DecimalPoint());
         if (search == Pass::TooManyUnknown) {
             retryOrRaise("ERR_UnknownDataOrDelimiter");
@@ -121,24 +107,18 @@ void ZonCloudReadAsciiLibre::AnalyseFile()
             retryOrRaise("ERR_UnknownData");
             continue;
         }
-        try {
-            _lines.Start(_file, _dataStart);
-        } catch (...) {
-            CloseFile();
-            throw;
-        }
-        if (CountPoints(guard.DecimalPoint(), fileSize, low, high) == Pass::TooManyUnknown) {
+        // Usually still in the buffer of the search: no second read.
+        _lines.Start(source, _dataStart);
+        if (CountPoints(guard.DecimalPoint(), low, high) == Pass::TooManyUnknown) {
             retryOrRaise("ERR_UnknownDataOrDelimiter");
             continue;
         }
         break;
     }
-    _lines.Release();
 
     if (_numberOfPoints > 0 && low[0] <= high[0] && low[1] <= high[1] && low[2] <= high[2])
         _boundingBox = ZonMathBox(low[0], high[0], low[1], high[1], low[2], high[2]);
     if (_boundingBox.IsEmpty()) {
-        CloseFile();
         ResetAnalysis();
         ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_NoPointFound");
     }
@@ -154,7 +134,7 @@ ZonCloudReadAsciiLibre::Pass ZonCloudReadAsciiLibre::SearchFormat(char decimalPo
     int unknown = 0;
     bool candidate = false;
     bool candidateReadsItself = false;
-    std::int64_t candidateOffset = 0;
+    std::uint64_t candidateOffset = 0;
     const char* first = nullptr;
     const char* last = nullptr;
     double xyz[3];
@@ -171,7 +151,7 @@ ZonCloudReadAsciiLibre::Pass ZonCloudReadAsciiLibre::SearchFormat(char decimalPo
             _format.Build(labels);
             candidate = true;
             candidateReadsItself = _format.Parse(first, last, decimalPoint, xyz);
-            candidateOffset = _lines.PieceOffset();
+            candidateOffset = _lines.LineOffset();
         } else if (++unknown > kMaxUnknownInSearch) {
             return Pass::TooManyUnknown;
         }
@@ -186,15 +166,15 @@ ZonCloudReadAsciiLibre::Pass ZonCloudReadAsciiLibre::SearchFormat(char decimalPo
     return Pass::EndOfFile;
 }
 
-ZonCloudReadAsciiLibre::Pass ZonCloudReadAsciiLibre::CountPoints(char decimalPoint, std::int64_t fileSize,
-                                                                 double low[3], double high[3])
+ZonCloudReadAsciiLibre::Pass ZonCloudReadAsciiLibre::CountPoints(char decimalPoint, double low[3], double high[3])
 {
     for (int axis = 0; axis < 3; ++axis) {
         low[axis] = DBL_MAX;
         high[axis] = -DBL_MAX;
     }
     // The counted points are worth keeping only while they take no more room
-    // than the file they came from.
+    // than the file they came from (of unknown size: not at all).
+    const std::int64_t fileSize = std::max<std::int64_t>(_source.Size(), 0);
     const std::size_t pointSize = 3 * (_doublePrecision ? sizeof(double) : sizeof(float));
     _keepLimit = fileSize > 0 ? static_cast<std::size_t>(fileSize) / pointSize : 0;
     _keeping = _keepLimit > 0;
@@ -209,12 +189,14 @@ ZonCloudReadAsciiLibre::Pass ZonCloudReadAsciiLibre::CountPoints(char decimalPoi
     bool reserved = false;
     while (_lines.Next(first, last)) {
         if (_format.Parse(first, last, decimalPoint, xyz)) {
-            if (count == INT_MAX) ZonCloudOperErrorTool::ThrowInsufficientMemory();
+            if (count == INT_MAX) RaiseMemoryError();
             if (!reserved && _keeping) {
                 // Lines of a file tend to be alike: the first one tells how many may follow.
                 const auto lineLength = static_cast<std::size_t>(std::max<std::ptrdiff_t>(last - first, 1));
                 const std::size_t estimate =
-                    static_cast<std::size_t>(std::max<std::int64_t>(fileSize - _dataStart, 0)) / lineLength + 16;
+                    static_cast<std::size_t>(std::max<std::int64_t>(fileSize - static_cast<std::int64_t>(_dataStart), 0)) /
+                        lineLength +
+                    16;
                 const std::size_t points = std::min(estimate + estimate / 16, _keepLimit);
                 try {
                     if (_doublePrecision)
@@ -318,9 +300,8 @@ void ZonCloudReadAsciiLibre::SetDelimiters(const ZonUnicodeString& begin, const 
         // Delimiter lines are not unknown lines: what the analysis counted
         // depends on them, so new delimiters mean a new analysis.
         if (_analysed) {
-            _analysed = false;
+            Reanalyse();
             ResetAnalysis();
-            ClearBoxCaches();
         }
     }
     _beginDelimiter = begin.ToUtf8();
@@ -383,11 +364,13 @@ const T* ZonCloudReadAsciiLibre::DeliverPoints(unsigned& count, std::vector<T>& 
     Analyse();
     if (_numberOfPoints <= 0) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_NoPointFound");
     if (!delivered) {
-        if (!SampleKeptPoints(store, delivered, deliveredCount)) {
-            ReadPoints(store);
-            delivered = store.data();
-            deliveredCount = static_cast<unsigned>(store.size() / 3);
-        }
+        Guarded([&] {
+            if (!SampleKeptPoints(store, delivered, deliveredCount)) {
+                ReadPoints(store);
+                delivered = store.data();
+                deliveredCount = static_cast<unsigned>(store.size() / 3);
+            }
+        });
     }
     count = deliveredCount;
     return delivered;
@@ -418,7 +401,7 @@ bool ZonCloudReadAsciiLibre::SampleKeptPoints(std::vector<T>& store, const T*& d
     sampler.Restart();
     const bool scans = _digitizationType == DigitizationScans;
     store.clear();
-    ReserveOrThrow(store, 3 * FirstCapacity(n, sampler.Step(), scans));
+    Reserve(store, 3 * FirstCapacity(n, sampler.Step(), scans));
     std::size_t run = 0;
     for (std::size_t i = 0; i < n; ++i) {
         if (scans) {
@@ -433,7 +416,7 @@ bool ZonCloudReadAsciiLibre::SampleKeptPoints(std::vector<T>& store, const T*& d
         double xyz[3];
         for (int axis = 0; axis < 3; ++axis)
             xyz[axis] = fromDouble ? keptDouble[3 * i + axis] : static_cast<double>(keptFloat[3 * i + axis]);
-        PushOrThrow(store, xyz);
+        Push(store, xyz);
     }
     delivered = store.data();
     deliveredCount = static_cast<unsigned>(store.size() / 3);
@@ -448,25 +431,20 @@ void ZonCloudReadAsciiLibre::ReadPoints(std::vector<T>& store)
     ZonCloudSampler sampler(_samplingPercent);
     sampler.Restart();
     store.clear();
-    ReserveOrThrow(store, 3 * FirstCapacity(n, sampler.Step(), scans));
+    Reserve(store, 3 * FirstCapacity(n, sampler.Step(), scans));
 
-    try {
-        _lines.Start(_file, _dataStart);
-    } catch (...) {
-        Free(store);
-        throw;
-    }
+    const ReleasedAtEnd released(_lines);
+    _lines.Start(Source(), _dataStart);
     const char* first = nullptr;
     const char* last = nullptr;
     double xyz[3];
     while (store.size() / 3 < n && _lines.Next(first, last)) {
         if (_format.Parse(first, last, _decimalPoint, xyz)) {
-            if (sampler.Keep()) PushOrThrow(store, xyz);
+            if (sampler.Keep()) Push(store, xyz);
         } else if (scans && IsDelimiterLine(first, last)) {
             sampler.Restart();
         }
     }
-    _lines.Release();
 }
 
 // ---------------------------------------------------------------------------
@@ -513,8 +491,7 @@ void ZonCloudReadAsciiLibre::BeginGetScan()
     if (!_setBegun || !_setDelivered)
         ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Usage, "ERR_NextSetOfScansNotDone");
     FreeScanArrays();
-    if (!_file) OpenFile();
-    _lines.Start(_file, _dataStart);
+    Guarded([this] { _lines.Start(Source(), _dataStart); });
     _scanOffset = _dataStart;
     _scanIndex = 0;
     _scanBegun = true;
@@ -526,10 +503,22 @@ bool ZonCloudReadAsciiLibre::NextScan()
     if (!_scanBegun) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Usage, "ERR_BeginGetScanNotDone");
     FreeScanArrays();
     if (_scanIndex < 0) return false;
+    Guarded([this] { ReadScan(); });
+    return true;
+}
 
-    // Go on from where the previous scan ended, unless another read moved away.
-    if (!_file) OpenFile();
-    if (!_lines.IsAt(_file, _scanOffset)) _lines.Start(_file, _scanOffset);
+void ZonCloudReadAsciiLibre::StartLines(std::uint64_t offset)
+{
+    // Go on from where the previous read ended, unless another read moved
+    // away or a failure closed the source.
+    const bool open = _source.IsOpen();
+    ZonCloudByteSource& source = Source();
+    if (!open || !_lines.IsAt(&source, offset)) _lines.Start(source, offset);
+}
+
+void ZonCloudReadAsciiLibre::ReadScan()
+{
+    StartLines(_scanOffset);
     ZonCloudSampler sampler(_samplingPercent);
     sampler.Restart();
     const std::size_t limit = static_cast<std::size_t>(_numberOfPoints);
@@ -542,7 +531,7 @@ bool ZonCloudReadAsciiLibre::NextScan()
     while (!complete && _lines.Next(first, last)) {
         if (open) {
             if (_format.Parse(first, last, _decimalPoint, xyz)) {
-                if (sampler.Keep() && _scanPointsDouble.size() / 3 < limit) PushOrThrow(_scanPointsDouble, xyz);
+                if (sampler.Keep() && _scanPointsDouble.size() / 3 < limit) Push(_scanPointsDouble, xyz);
             } else if (StartsWithDelimiter(first, last, _endDelimiter)) {
                 complete = endIsBegin;
                 open = false;
@@ -566,7 +555,6 @@ bool ZonCloudReadAsciiLibre::NextScan()
         _lines.Release();
         if (_scanPointsDouble.empty()) FreeScanArrays();
     }
-    return true;
 }
 
 const double* ZonCloudReadAsciiLibre::GetScanPointsDouble(unsigned& count)
@@ -584,11 +572,8 @@ const float* ZonCloudReadAsciiLibre::GetScanPoints(unsigned& count)
     count = static_cast<unsigned>(_scanPointsDouble.size() / 3);
     if (count == 0) return nullptr;
     if (!_scanHasFloats) {
-        try {
-            _scanPoints.assign(_scanPointsDouble.begin(), _scanPointsDouble.end());
-        } catch (const std::bad_alloc&) {
-            ZonCloudOperErrorTool::ThrowInsufficientMemory();
-        }
+        Reserve(_scanPoints, _scanPointsDouble.size());
+        _scanPoints.assign(_scanPointsDouble.begin(), _scanPointsDouble.end());
         _scanHasFloats = true;
     }
     return _scanPoints.data();

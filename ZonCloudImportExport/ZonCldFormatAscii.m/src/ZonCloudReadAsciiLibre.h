@@ -4,8 +4,8 @@
 #include <vector>
 
 #include "ZonCloudAsciiLineFormat.h"
+#include "ZonCloudLineSource.h"
 #include "ZonCloudReadFile.h"
-#include "ZonCloudTextLineReader.h"
 #include "ZonICloudReadOptDelimitor.h"
 #include "ZonICloudReadOptDirection.h"
 #include "ZonTieCloudReadFile.h"
@@ -67,7 +67,7 @@ private:
 
     void ResetAnalysis();
     Pass SearchFormat(char decimalPoint);
-    Pass CountPoints(char decimalPoint, std::int64_t fileSize, double low[3], double high[3]);
+    Pass CountPoints(char decimalPoint, double low[3], double high[3]);
     void KeepPoint(const double xyz[3]);
     void DropKeptPoints();
 
@@ -80,13 +80,15 @@ private:
     bool SampleKeptPoints(std::vector<T>& store, const T*& delivered, unsigned& deliveredCount);
     template <class T>
     void ReadPoints(std::vector<T>& store);
+    void ReadScan();
+    void StartLines(std::uint64_t offset);
     void FreePointArrays();
     void FreeScanArrays();
     void RequireScans();
 
     // What the analysis found.
     ZonCloudAsciiLineFormat _format;
-    std::int64_t _dataStart = 0;
+    std::uint64_t _dataStart = 0;
     char _decimalPoint = '.';
     bool _decimalPointSwitched = false;
     bool _delimitersFound = false;
@@ -116,10 +118,12 @@ private:
     bool _setBegun = false;
     bool _setDelivered = false;
     bool _scanBegun = false;
-    std::int64_t _scanOffset = 0;
+    std::uint64_t _scanOffset = 0;
     std::vector<double> _scanPointsDouble;
     std::vector<float> _scanPoints;
     bool _scanHasFloats = false;
 
-    ZonCloudTextLineReader _lines;
+    // Pieces as a 512-character fgets buffer receives them: the layouts and
+    // limits of this format count lines that way.
+    ZonCloudLineSource _lines;
 };
