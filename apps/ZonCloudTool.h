@@ -68,6 +68,8 @@ struct ZonToolReaderOptions {
 // Writes numbers so that they read back to the same float or double.
 nlohmann::json ZonToolNumber(float value);
 nlohmann::json ZonToolNumber(double value);
+// A box as [xmin, ymin, zmin, xmax, ymax, zmax], null when empty.
+nlohmann::json ZonToolBoxJson(const ZonMathBox& box);
 nlohmann::json ZonToolErrorJson(const ZonError& error);
 
 // Each command adds itself and returns the function that runs it.

@@ -71,6 +71,16 @@ nlohmann::json ZonToolNumber(float value)
 // The JSON writer prints a double's shortest round-trip text.
 nlohmann::json ZonToolNumber(double value) { return std::isfinite(value) ? nlohmann::json(value) : nullptr; }
 
+nlohmann::json ZonToolBoxJson(const ZonMathBox& box)
+{
+    if (box.IsEmpty()) return nullptr;
+    const ZonMathPoint& low = box.GetLow();
+    const ZonMathPoint& high = box.GetHigh();
+    nlohmann::json list = nlohmann::json::array();
+    for (double v : {low[0], low[1], low[2], high[0], high[1], high[2]}) list.push_back(ZonToolNumber(v));
+    return list;
+}
+
 nlohmann::json ZonToolErrorJson(const ZonError& error)
 {
     return {{"catalog", error.GetCatalogName()},

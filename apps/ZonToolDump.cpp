@@ -41,7 +41,7 @@ public:
         out["unit"] = unit ? nlohmann::json(unit->Name()) : nlohmann::json(nullptr);
         ZonMathBox box;
         _reader->GetBoundingBox(box);
-        out["bbox"] = BoxJson(box);
+        out["bbox"] = ZonToolBoxJson(box);
         out["points"] = _reader->GetNumberOfPoints();
         out["cloud"] = Cloud();
         if (type == DigitizationScans)
@@ -54,16 +54,6 @@ public:
     }
 
 private:
-    static nlohmann::json BoxJson(const ZonMathBox& box)
-    {
-        if (box.IsEmpty()) return nullptr;
-        const ZonMathPoint& low = box.GetLow();
-        const ZonMathPoint& high = box.GetHigh();
-        nlohmann::json list = nlohmann::json::array();
-        for (double v : {low[0], low[1], low[2], high[0], high[1], high[2]}) list.push_back(ZonToolNumber(v));
-        return list;
-    }
-
     nlohmann::json Cloud()
     {
         nlohmann::json cloud;

@@ -18,15 +18,6 @@ const char* TypeName(int type)
     }
 }
 
-nlohmann::json BoxJson(const ZonMathBox& box)
-{
-    if (box.IsEmpty()) return nullptr;
-    const ZonMathPoint& low = box.GetLow();
-    const ZonMathPoint& high = box.GetHigh();
-    nlohmann::json list = nlohmann::json::array();
-    for (double v : {low[0], low[1], low[2], high[0], high[1], high[2]}) list.push_back(ZonToolNumber(v));
-    return list;
-}
 }  // namespace
 
 ZonToolRun ZonToolAddInfo(CLI::App& app)
@@ -55,7 +46,7 @@ ZonToolRun ZonToolAddInfo(CLI::App& app)
             {"grids", body->GetNumberOfGrids()},
             {"polygons", body->GetPolygons().size()},
             {"triangles", body->GetNumberOfTriangles()},
-            {"bbox", BoxJson(body->GetBox())},
+            {"bbox", ZonToolBoxJson(body->GetBox())},
             {"unit", body->GetUnitName()},
             {"messages", messages},
             {"statistics", statistics},
