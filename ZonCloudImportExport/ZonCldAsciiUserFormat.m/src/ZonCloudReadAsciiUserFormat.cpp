@@ -3,14 +3,13 @@
 #include <algorithm>
 #include <array>
 #include <cerrno>
-#include <cmath>
 #include <cstring>
 #include <limits>
-#include <new>
 
-#include "ZonCloudOperErrorTool.h"
+#include "ZonCloudByteSource.h"
+#include "ZonCloudLineSource.h"
 #include "ZonCloudReadNLSTool.h"
-#include "ZonCloudReadTextTool.h"
+#include "ZonCloudSampler.h"
 #include "ZonCloudScanFormat.h"
 
 namespace {
@@ -22,84 +21,86 @@ constexpr std::array<std::string_view, 15> Vocabulary = {
 constexpr unsigned char Palette[8][3] = {{0, 0, 0},     {255, 255, 255}, {255, 0, 0},   {0, 255, 0},
                                          {0, 0, 255},   {255, 255, 0},   {255, 0, 255}, {0, 255, 255}};
 
-constexpr int DataLineSize = 512;  // lines of at most 511 characters
-constexpr int FdfLineSize = 255;   // the FDF line: at most 254 characters
-constexpr int SampleLines = 20;    // lines read to estimate the number of points
+constexpr std::size_t DataLinePiece = ZonCloudLineSource::FgetsPiece;  // lines cut after 511 characters
+constexpr std::size_t FdfLinePiece = 254;  // the FDF line: its first 254 characters
+constexpr std::size_t FdfBlock = 4096;     // only the first line of an FDF is read
+constexpr int SampleLines = 20;            // lines read to estimate the number of points
 constexpr std::uint64_t GrowthStep = 8192;
-constexpr int MaxTokens = DataLineSize / 2 + 1;
+constexpr int MaxTokens = static_cast<int>(DataLinePiece + 1) / 2 + 1;
 
 bool IsSeparator(char c) { return c == ' ' || c == '\t' || c == '\r' || c == '\n' || c == '\v' || c == '\f'; }
 
-// Cuts the line at the character before its first newline: that removes the
-// CR of a CR LF line, and on a line ended by LF alone it eats the last
-// character of the last word. Files have always been read this way.
-void CutBeforeNewline(char* line)
+// The end of a line's text: the character before its newline goes with the
+// newline. That removes the CR of a CR LF line, and on a line ended by LF
+// alone it eats the last character of the last word. Files have always been
+// read this way. (A newline can only end a piece; a lone "\n" keeps it as a
+// separator.)
+const char* CutBeforeNewline(const char* first, const char* last)
 {
-    char* newline = std::strchr(line, '\n');
-    if (newline && newline > line) newline[-1] = '\0';
+    return last - first > 1 && last[-1] == '\n' ? last - 2 : last;
 }
 
-// Splits in place, as strtok would: each token ends with a NUL.
-int Tokenize(char* line, char* tokens[], int maxTokens)
-{
-    int n = 0;
-    char* p = line;
-    while (*p && n < maxTokens) {
-        while (*p && IsSeparator(*p)) ++p;
-        if (!*p) break;
-        tokens[n++] = p;
-        while (*p && !IsSeparator(*p)) ++p;
-        if (*p) *p++ = '\0';
-    }
-    return n;
-}
-
-// A data line's token, split in place; whether it holds a double quote is
-// noted on the way, so quoted texts cost nothing to lines without them.
+// A token of a line: its text is [text, text + length). Whether it holds a
+// double quote is noted on the way, so quoted texts cost nothing to lines
+// without them.
 struct Token {
-    char* text;
+    const char* text;
     int length;
     bool quoted;
+    const char* End() const { return text + length; }
 };
 
-int TokenizeData(char* line, Token tokens[], int maxTokens)
+// Splits [first, last) at white space; a NUL ends the line, as it ended the
+// C string the format has always been read as.
+int Tokenize(const char* first, const char* last, Token tokens[], int maxTokens)
 {
     int n = 0;
-    char* p = line;
-    while (*p && n < maxTokens) {
-        while (*p && IsSeparator(*p)) ++p;
-        if (!*p) break;
-        char* start = p;
+    const char* p = first;
+    while (p < last && *p && n < maxTokens) {
+        while (p < last && *p && IsSeparator(*p)) ++p;
+        if (p == last || !*p) break;
+        const char* start = p;
         bool quoted = false;
-        while (*p && !IsSeparator(*p)) {
+        while (p < last && *p && !IsSeparator(*p)) {
             quoted |= *p == '"';
             ++p;
         }
         tokens[n++] = {start, static_cast<int>(p - start), quoted};
-        if (*p) *p++ = '\0';
+        if (p < last && *p) ++p;
     }
     return n;
 }
 
-// A real column: a decimal comma reads as a point. Parsing with '.' gives
-// what the locale's own decimal point would after the same swap. Tokens made
-// only of digits, signs, points and exponent letters read the same under
-// strtod's rules as under scanf's "%le", and skip the general scan.
+// A real column: a decimal comma reads as a point (such a token is read from
+// a copy with the commas replaced). Parsing with '.' gives what the locale's
+// own decimal point would after the same swap. Tokens made only of digits,
+// signs, points and exponent letters read the same under strtod's rules as
+// under scanf's "%le", and skip the general scan.
 double ReadReal(const Token& token)
 {
     static const ZonCloudScanFormat realFormat("%le");
     bool simple = true;
+    bool comma = false;
     for (int i = 0; i < token.length; ++i) {
-        char& c = token.text[i];
-        if (c == ',') c = '.';
-        const bool plain = (c >= '0' && c <= '9') || c == '.' || c == '-' || c == '+' || c == 'e' || c == 'E';
+        const char c = token.text[i];
+        comma |= c == ',';
+        const bool plain =
+            (c >= '0' && c <= '9') || c == '.' || c == ',' || c == '-' || c == '+' || c == 'e' || c == 'E';
         simple &= plain;
     }
+    const char* text = token.text;
+    char copy[DataLinePiece];
+    if (comma) {
+        std::replace_copy(token.text, token.End(), copy, ',', '.');
+        text = copy;
+    }
     double value = 0.0;
-    if (simple)
-        ZonParseDouble(token.text, token.text + token.length, '.', value);
-    else
-        realFormat(token.text, '.', &value);
+    if (simple) {
+        ZonParseDouble(text, text + token.length, '.', value);
+    } else {
+        void* const destination[] = {&value, nullptr};
+        realFormat.Scan(text, text + token.length, '.', destination);
+    }
     return value;
 }
 
@@ -109,7 +110,7 @@ void ReadInteger(const Token& token, std::int32_t& target)
 {
     static const ZonCloudScanFormat integerFormat("%d");
     const char* p = token.text;
-    const char* end = token.text + token.length;
+    const char* end = token.End();
     const bool negative = *p == '-';
     if (*p == '-' || *p == '+') ++p;
     const char* digits = p;
@@ -119,7 +120,8 @@ void ReadInteger(const Token& token, std::int32_t& target)
         target = negative ? -value : value;
         return;
     }
-    integerFormat(token.text, '.', &target);
+    void* const destination[] = {&target, nullptr};
+    integerFormat.Scan(token.text, end, '.', destination);
 }
 
 }  // namespace
@@ -177,24 +179,20 @@ void ZonCloudReadAsciiUserFormat::ReadFDF()
 {
     // The first FDF fixes the columns for the life of the reader.
     if (_fdfRead || _fdfPath.IsNull()) return;
-    errno = 0;
-    FILE* fdf = std::fopen(_fdfPath.c_str(), "rb");
-    if (!fdf) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, nullptr);
-    ZonCloudReadTextTool::FileCloser closer{fdf};
-
-    char line[FdfLineSize] = {};
-    if (!std::fgets(line, sizeof line, fdf)) {
-        if (std::ferror(fdf)) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Input, nullptr);
-        line[0] = '\0';
-    }
-    CutBeforeNewline(line);
+    ZonCloudByteSource fdf;
+    fdf.Open(_fdfPath.ToUtf8());
+    ZonCloudLineSource lines(FdfLinePiece, FdfBlock);
+    lines.Start(fdf, 0);
+    const char* first = nullptr;
+    const char* last = nullptr;
+    if (!lines.Next(first, last)) first = last = nullptr;
 
     // Words that are not keywords take no column.
     _fields.clear();
-    char* tokens[FdfLineSize];
-    const int n = Tokenize(line, tokens, FdfLineSize);
+    Token tokens[FdfLinePiece];
+    const int n = Tokenize(first, CutBeforeNewline(first, last), tokens, static_cast<int>(FdfLinePiece));
     for (int i = 0; i < n; ++i) {
-        const int code = FieldCodeOf(tokens[i]);
+        const int code = FieldCodeOf(std::string_view(tokens[i].text, static_cast<std::size_t>(tokens[i].length)));
         if (code != 0) _fields.push_back(code);
     }
     _fieldsHaveColor = _fieldsHaveAlpha = _fieldsHaveSymbol = _fieldsHaveText = false;
@@ -209,7 +207,12 @@ void ZonCloudReadAsciiUserFormat::ReadFDF()
 
 void ZonCloudReadAsciiUserFormat::Discard()
 {
-    ZonCloudReadTextTool::Free(_points, _pointsDouble, _colors, _alphas, _symbols, _texts);
+    std::vector<float>().swap(_points);
+    std::vector<double>().swap(_pointsDouble);
+    std::vector<unsigned char>().swap(_colors);
+    std::vector<std::int32_t>().swap(_alphas);
+    std::vector<std::int32_t>().swap(_symbols);
+    std::vector<std::string>().swap(_texts);
     _count = 0;
     _capacity = 0;
     _hasColor = _hasAlpha = _hasSymbol = _hasText = false;
@@ -235,10 +238,14 @@ bool ZonCloudReadAsciiUserFormat::Prepare(bool wantDouble)
     return true;
 }
 
-std::uint64_t ZonCloudReadAsciiUserFormat::EstimateCapacity(std::uint64_t fileSize)
+std::uint64_t ZonCloudReadAsciiUserFormat::EstimateCapacity(ZonCloudLineSource& lines, std::uint64_t fileSize)
 {
-    const std::uint64_t average = ZonCloudReadTextTool::AverageLineLength(_file, SampleLines, DataLineSize);
-    RewindFile();
+    // The average length of the first lines; the caller starts the lines again.
+    const char* first = nullptr;
+    const char* last = nullptr;
+    std::uint64_t sampled = 0;
+    while (sampled < SampleLines && lines.Next(first, last)) ++sampled;
+    const std::uint64_t average = sampled > 0 ? lines.NextOffset() / sampled : 0;
     if (average == 0) return 0;
     // A complete line holds one token per column and a separator between
     // them, so no file has more points than this; the estimate never asks
@@ -252,30 +259,39 @@ void ZonCloudReadAsciiUserFormat::Load(bool asDouble)
 {
     Discard();
     _loadedAsDouble = asDouble;
-    OpenFile();
-    ZonCloudReadTextTool::FileCloser closer{_file};
-    std::setvbuf(_file, nullptr, _IOFBF, 1 << 20);
+    Guarded([this] {
+        ZonCloudByteSource& source = Source();
+        _completeLines = 0;
+        _dataStart = 0;
+        if (source.Size() < 0) {
+            // A stream without a size (a pipe) cannot be estimated.
+            errno = ESPIPE;
+            ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Input, nullptr);
+        }
+        ZonCloudLineSource lines(DataLinePiece);
+        lines.Start(source, 0);
+        _estimate = EstimateCapacity(lines, static_cast<std::uint64_t>(source.Size()));
+        lines.Start(source, 0);
+        ReadLines(lines);
+        // Everything is in memory now.
+        CloseSource();
+    });
+}
 
-    _completeLines = 0;
-    _dataStart = 0;
-    // The product k * r is taken in double precision from the float ratio.
-    const double ratio = static_cast<float>(_samplingPercent / 100.0f);
-
-    const std::uint64_t size = ZonCloudReadTextTool::FileSize(_file);
-    RewindFile();
-    _estimate = EstimateCapacity(size);
-
+void ZonCloudReadAsciiUserFormat::ReadLines(ZonCloudLineSource& lines)
+{
     _colorIndex = 3;
     _symbolIndex = 0;
-    double previousWhole = 1.0;
+    ZonCloudSampler sampler = ZonCloudSampler::InDouble(_samplingPercent);
     ZonMathBox box;
     LineValues values;
-    char line[DataLineSize];
-    while (std::fgets(line, sizeof line, _file)) {
+    const char* first = nullptr;
+    const char* last = nullptr;
+    while (lines.Next(first, last)) {
         bool complete = false;
-        ParseLine(line, values, complete);
+        ParseLine(first, last, values, complete);
         if (!complete) {
-            if (_completeLines == 0) _dataStart = ZonCloudReadTextTool::LineEnd(_file);
+            if (_completeLines == 0) _dataStart = static_cast<long>(lines.NextOffset());
             continue;
         }
         const auto above255 = [](std::int32_t v) { return static_cast<std::uint32_t>(v) > 255u; };
@@ -294,15 +310,10 @@ void ZonCloudReadAsciiUserFormat::Load(bool asDouble)
             ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_SymbolIndexOutOfRange");
         if (_keepColors && (values.colorCounter == 3 || values.colorCounter == 4)) _hasColor = true;
 
-        const double before = static_cast<double>(_completeLines);
         ++_completeLines;
         box.AddPoint(values.x, values.y, values.z);
-        const double whole = std::trunc(before * ratio);
-        if (whole == previousWhole) continue;
-        previousWhole = whole;
-        StorePoint(values);
+        if (sampler.Keep()) StorePoint(values);
     }
-    if (std::ferror(_file)) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Input, nullptr);
 
     if (_completeLines > 0) _boundingBox = box;
     _numberOfPoints = static_cast<int>(std::min<std::int64_t>(_completeLines, std::numeric_limits<int>::max()));
@@ -310,7 +321,7 @@ void ZonCloudReadAsciiUserFormat::Load(bool asDouble)
     _analysed = true;
 }
 
-void ZonCloudReadAsciiUserFormat::ParseLine(char* line, LineValues& values, bool& complete)
+void ZonCloudReadAsciiUserFormat::ParseLine(const char* first, const char* last, LineValues& values, bool& complete)
 {
     values.x = values.y = values.z = 0.0;
     values.r = 0;
@@ -321,9 +332,8 @@ void ZonCloudReadAsciiUserFormat::ParseLine(char* line, LineValues& values, bool
     values.text.clear();
     complete = false;
 
-    CutBeforeNewline(line);
     Token tokens[MaxTokens];
-    const int tokenCount = TokenizeData(line, tokens, MaxTokens);
+    const int tokenCount = Tokenize(first, CutBeforeNewline(first, last), tokens, MaxTokens);
     if (tokenCount == 0 || tokens[0].text[0] == '!') return;
 
     const std::size_t fieldCount = _fields.size();
@@ -335,16 +345,16 @@ void ZonCloudReadAsciiUserFormat::ParseLine(char* line, LineValues& values, bool
         quoted.clear();
         if (token.quoted) {
             // A quoted text may run over several tokens; those take no column.
-            const char* rest = std::strchr(token.text, '"') + 1;
-            if (const char* close = std::strchr(rest, '"')) {
+            const char* rest = std::find(token.text, token.End(), '"') + 1;
+            if (const char* close = std::find(rest, token.End(), '"'); close != token.End()) {
                 quoted.assign(rest, close);
             } else {
-                quoted.assign(rest);
+                quoted.assign(rest, token.End());
                 while (t + 1 < tokenCount) {
                     const Token& next = tokens[++t];
                     quoted += ' ';
                     if (next.quoted) {
-                        quoted.append(next.text, std::strchr(next.text, '"'));
+                        quoted.append(next.text, std::find(next.text, next.End(), '"'));
                         break;
                     }
                     quoted.append(next.text, next.length);
@@ -407,19 +417,19 @@ void ZonCloudReadAsciiUserFormat::Grow()
 {
     const std::uint64_t capacity = (_capacity == 0 && _estimate != 0) ? _estimate : _capacity + GrowthStep;
     if (_loadedAsDouble)
-        ZonCloudReadTextTool::Reserve(_pointsDouble, 3 * capacity);
+        Reserve(_pointsDouble, 3 * capacity);
     else
-        ZonCloudReadTextTool::Reserve(_points, 3 * capacity);
-    if (_fieldsHaveColor && _keepColors) ZonCloudReadTextTool::Reserve(_colors, 3 * capacity);
-    if (_fieldsHaveAlpha) ZonCloudReadTextTool::Reserve(_alphas, capacity);
-    if (_fieldsHaveSymbol) ZonCloudReadTextTool::Reserve(_symbols, capacity);
-    if (_fieldsHaveText) ZonCloudReadTextTool::Reserve(_texts, capacity);
+        Reserve(_points, 3 * capacity);
+    if (_fieldsHaveColor && _keepColors) Reserve(_colors, 3 * capacity);
+    if (_fieldsHaveAlpha) Reserve(_alphas, capacity);
+    if (_fieldsHaveSymbol) Reserve(_symbols, capacity);
+    if (_fieldsHaveText) Reserve(_texts, capacity);
     _capacity = capacity;
 }
 
 void ZonCloudReadAsciiUserFormat::StorePoint(const LineValues& values)
 {
-    if (_count >= std::numeric_limits<unsigned>::max()) ZonCloudOperErrorTool::ThrowInsufficientMemory();
+    if (_count >= std::numeric_limits<unsigned>::max()) RaiseMemoryError();
     if (_count == _capacity) Grow();
     if (_loadedAsDouble) {
         _pointsDouble.push_back(values.x);
@@ -447,11 +457,7 @@ const float* ZonCloudReadAsciiUserFormat::GetPoints(unsigned& count)
     if (!Prepare(false)) return nullptr;
     if (_loadedAsDouble && _points.size() != 3 * _count) {
         // Loaded for doubles: floats are the same values narrowed.
-        try {
-            _points.assign(_pointsDouble.begin(), _pointsDouble.end());
-        } catch (const std::bad_alloc&) {
-            ZonCloudOperErrorTool::ThrowInsufficientMemory();
-        }
+        Guarded([this] { _points.assign(_pointsDouble.begin(), _pointsDouble.end()); });
     }
     count = static_cast<unsigned>(_count);
     return _points.data();

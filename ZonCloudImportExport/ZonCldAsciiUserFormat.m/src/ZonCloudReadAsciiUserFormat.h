@@ -9,6 +9,8 @@
 #include "ZonICloudReadOptColor.h"
 #include "ZonICloudReadOptUserFormat.h"
 
+class ZonCloudLineSource;
+
 // Reads an ASCII user format file: a text point file whose columns are named,
 // in order, by the first line of a separate format description file (FDF).
 // The whole file is loaded at once into per-point arrays and handed out as
@@ -86,8 +88,9 @@ private:
     void Discard();
     // The common entry of every array access: false when no FDF was read.
     bool Prepare(bool wantDouble);
-    std::uint64_t EstimateCapacity(std::uint64_t fileSize);
-    void ParseLine(char* line, LineValues& values, bool& complete);
+    std::uint64_t EstimateCapacity(ZonCloudLineSource& lines, std::uint64_t fileSize);
+    void ReadLines(ZonCloudLineSource& lines);
+    void ParseLine(const char* first, const char* last, LineValues& values, bool& complete);
     void StorePoint(const LineValues& values);
     void Grow();
 

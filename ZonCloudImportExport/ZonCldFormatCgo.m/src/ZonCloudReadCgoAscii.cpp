@@ -1,24 +1,21 @@
 #include "ZonCloudReadCgoAscii.h"
 
 #include <algorithm>
-#include <cerrno>
-#include <cmath>
-#include <cstring>
 #include <type_traits>
 
 #include "DecimalPointGuard.h"
-#include "ZonCloudReadNLSTool.h"
-#include "ZonCloudReadTextTool.h"
+#include "ZonCloudLineSource.h"
+#include "ZonCloudSampler.h"
 #include "ZonCloudScanFormat.h"
 
 namespace {
 
-// Scans a line in the precision of T; the number of values converted.
+// The format that scans a point in the precision of T.
 template <class T>
-int ScanPoint(const char* line, char decimalPoint, T xyz[3])
+const ZonCloudScanFormat& PointFormat()
 {
     static const ZonCloudScanFormat format(std::is_same_v<T, double> ? "%lf%lf%lf" : "%f%f%f");
-    return format(line, decimalPoint, &xyz[0], &xyz[1], &xyz[2]);
+    return format;
 }
 
 }  // namespace
@@ -32,11 +29,12 @@ void ZonCloudReadCgoAscii::Discard()
     _otherRead = false;
 }
 
-bool ZonCloudReadCgoAscii::ScanLine(const char* line, char decimalPoint, double xyz[3], unsigned char*)
+bool ZonCloudReadCgoAscii::ScanLine(const char* first, const char* last, char decimalPoint, double xyz[3],
+                                    unsigned char*)
 {
-    if (_loadedAsDouble) return ScanPoint(line, decimalPoint, xyz) == 3;
+    if (_loadedAsDouble) return Scan(PointFormat<double>(), first, last, decimalPoint, &xyz[0], &xyz[1], &xyz[2]) == 3;
     float single[3] = {0.0f, 0.0f, 0.0f};
-    const int values = ScanPoint(line, decimalPoint, single);
+    const int values = Scan(PointFormat<float>(), first, last, decimalPoint, &single[0], &single[1], &single[2]);
     std::copy(single, single + 3, xyz);
     return values == 3;
 }
@@ -47,35 +45,30 @@ void ZonCloudReadCgoAscii::ReadAgain(std::vector<T>& points)
     points.clear();
     _otherCount = 0;
     _otherRead = false;
-    OpenFile();
-    ZonCloudReadTextTool::FileCloser closer{_file};
-    std::setvbuf(_file, nullptr, _IOFBF, 1 << 20);
-    errno = 0;
-    if (std::fseek(_file, _dataStart, SEEK_SET) != 0) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Input, nullptr);
-
-    DecimalPointGuard guard;
-    if (IsDecimalPointSwapped()) guard.Switch();
-    const double ratio = static_cast<float>(_samplingPercent / 100.0f);
-    const auto lines = static_cast<std::uint64_t>(_pointLines);
-    const std::uint64_t room = std::min(static_cast<std::uint64_t>(std::trunc(static_cast<double>(lines) * ratio)) + 1, lines);
-    ZonCloudReadTextTool::Reserve(points, 3 * room);
-
-    std::uint64_t index = 0;
-    double previousWhole = 1.0;
-    char line[LineSize];
-    while (_otherCount < room && std::fgets(line, sizeof line, _file)) {
-        T xyz[3] = {};
-        if (ScanPoint(line, guard.DecimalPoint(), xyz) != 3) {
-            if (std::strstr(line, EndOfCloud)) break;
-            continue;
+    Guarded([&] {
+        ZonCloudByteSource& source = Source();
+        DecimalPointGuard guard;
+        if (IsDecimalPointSwapped()) guard.Switch();
+        // The same lines sampled the same way give the points that were
+        // loaded, in the other precision: as many, and none after the last.
+        Reserve(points, 3 * _count);
+        ZonCloudSampler sampler = ZonCloudSampler::InDouble(_samplingPercent);
+        ZonCloudLineSource lines(LinePiece);
+        lines.Start(source, static_cast<std::uint64_t>(_dataStart));
+        const char* first = nullptr;
+        const char* last = nullptr;
+        while (_otherCount < _count && lines.Next(first, last)) {
+            T xyz[3] = {};
+            if (Scan(PointFormat<T>(), first, last, guard.DecimalPoint(), &xyz[0], &xyz[1], &xyz[2]) != 3) {
+                if (IsEndOfCloud(first, last)) break;
+                continue;
+            }
+            if (!sampler.Keep()) continue;
+            points.insert(points.end(), xyz, xyz + 3);
+            ++_otherCount;
         }
-        const double whole = std::trunc(static_cast<double>(index++) * ratio);
-        if (whole == previousWhole) continue;
-        previousWhole = whole;
-        points.insert(points.end(), xyz, xyz + 3);
-        ++_otherCount;
-    }
-    if (std::ferror(_file)) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Input, nullptr);
+        CloseSource();
+    });
     _otherRead = true;
 }
 

@@ -19,7 +19,8 @@ public:
     const double* GetPointsDouble(unsigned& count) override;
 
 protected:
-    bool ScanLine(const char* line, char decimalPoint, double xyz[3], unsigned char rgb[3]) override;
+    bool ScanLine(const char* first, const char* last, char decimalPoint, double xyz[3],
+                  unsigned char rgb[3]) override;
     void Discard() override;
 
 private:

@@ -22,7 +22,8 @@ void ZonCloudReadLeica::SetKeepColors(bool keep)
     Discard();
 }
 
-bool ZonCloudReadLeica::ScanLine(const char* line, char decimalPoint, double xyz[3], unsigned char rgb[3])
+bool ZonCloudReadLeica::ScanLine(const char* first, const char* last, char decimalPoint, double xyz[3],
+                                 unsigned char rgb[3])
 {
     static const ZonCloudScanFormat singleFormat("%f%f%f%d%d%d%d");
     static const ZonCloudScanFormat doubleFormat("%lf%lf%lf%d%d%d%d");
@@ -30,10 +31,11 @@ bool ZonCloudReadLeica::ScanLine(const char* line, char decimalPoint, double xyz
     int c[4] = {-1, -1, -1, -1};
     int values;
     if (_loadedAsDouble) {
-        values = doubleFormat(line, decimalPoint, &xyz[0], &xyz[1], &xyz[2], &c[0], &c[1], &c[2], &c[3]);
+        values = Scan(doubleFormat, first, last, decimalPoint, &xyz[0], &xyz[1], &xyz[2], &c[0], &c[1], &c[2], &c[3]);
     } else {
         float single[3] = {0.0f, 0.0f, 0.0f};
-        values = singleFormat(line, decimalPoint, &single[0], &single[1], &single[2], &c[0], &c[1], &c[2], &c[3]);
+        values = Scan(singleFormat, first, last, decimalPoint, &single[0], &single[1], &single[2], &c[0], &c[1], &c[2],
+                      &c[3]);
         std::copy(single, single + 3, xyz);
     }
     if (values < 3) return false;

@@ -22,5 +22,6 @@ public:
     const unsigned char* GetPointColors(unsigned& count) override;
 
 protected:
-    bool ScanLine(const char* line, char decimalPoint, double xyz[3], unsigned char rgb[3]) override;
+    bool ScanLine(const char* first, const char* last, char decimalPoint, double xyz[3],
+                  unsigned char rgb[3]) override;
 };

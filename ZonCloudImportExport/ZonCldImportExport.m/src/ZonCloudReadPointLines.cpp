@@ -1,15 +1,13 @@
 #include "ZonCloudReadPointLines.h"
 
 #include <algorithm>
-#include <cmath>
-#include <cstring>
+#include <cerrno>
 #include <limits>
+#include <string_view>
 
 #include "DecimalPointGuard.h"
-#include "ZonCloudOperErrorTool.h"
 #include "ZonCloudReadNLSTool.h"
-#include "ZonCloudReadTextTool.h"
-#include "ZonCloudScanFormat.h"
+#include "ZonCloudSampler.h"
 
 namespace {
 
@@ -38,7 +36,9 @@ void ZonCloudReadPointLines::SetSamplingPercent(float percent)
 
 void ZonCloudReadPointLines::Discard()
 {
-    ZonCloudReadTextTool::Free(_points, _pointsDouble, _colors);
+    std::vector<float>().swap(_points);
+    std::vector<double>().swap(_pointsDouble);
+    std::vector<unsigned char>().swap(_colors);
     _count = 0;
     _capacity = 0;
     _pointLines = 0;
@@ -53,15 +53,22 @@ void ZonCloudReadPointLines::AnalyseFile()
     Load(_doublePrecision);
 }
 
-void ZonCloudReadPointLines::Reserve(std::uint64_t capacity)
+bool ZonCloudReadPointLines::IsEndOfCloud(const char* first, const char* last)
+{
+    std::string_view text(first, static_cast<std::size_t>(last - first));
+    text = text.substr(0, text.find('\0'));
+    return text.find("**end cloud**") != std::string_view::npos;
+}
+
+void ZonCloudReadPointLines::MakeRoom(std::uint64_t capacity)
 {
     capacity = std::min(capacity, _mostPoints);
     if (capacity <= _capacity) capacity = _capacity + 1;
     if (_loadedAsDouble)
-        ZonCloudReadTextTool::Reserve(_pointsDouble, 3 * capacity);
+        Reserve(_pointsDouble, 3 * capacity);
     else
-        ZonCloudReadTextTool::Reserve(_points, 3 * capacity);
-    if (_keepColors) ZonCloudReadTextTool::Reserve(_colors, 3 * capacity);
+        Reserve(_points, 3 * capacity);
+    if (_keepColors) Reserve(_colors, 3 * capacity);
     _capacity = capacity;
 }
 
@@ -70,38 +77,45 @@ void ZonCloudReadPointLines::Load(bool asDouble)
     Discard();
     _loadedAsDouble = asDouble;
     _decimalSwapped = false;
-    OpenFile();
-    ZonCloudReadTextTool::FileCloser closer{_file};
-    std::setvbuf(_file, nullptr, _IOFBF, 1 << 20);
-
-    DecimalPointGuard guard;
-    const double ratio = static_cast<float>(_samplingPercent / 100.0f);
-
-    const std::uint64_t size = ZonCloudReadTextTool::FileSize(_file);
-    RewindFile();
-    _mostPoints = std::max<std::uint64_t>(size / 5 + 1, MinimumRoom);
-    // The estimate: the file size over the average length of the first lines.
-    const std::uint64_t average = ZonCloudReadTextTool::AverageLineLength(_file, SampleLines, LineSize);
-    _estimate = average > 0 ? size / average : 0;
-    RewindFile();
-
-    while (!ReadPass(guard.DecimalPoint(), ratio)) {
-        // Too many lines not understood: once, try the other decimal point.
-        if (_decimalSwapped || !guard.Switch()) {
-            CloseFile();
-            ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_TooManyUnknownData");
+    Guarded([this] {
+        ZonCloudByteSource& source = Source();
+        if (source.Size() < 0) {
+            // A stream without a size (a pipe) cannot be estimated nor read twice.
+            errno = ESPIPE;
+            ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Input, nullptr);
         }
-        _decimalSwapped = true;
-        std::clearerr(_file);
-        RewindFile();
-    }
+        const auto size = static_cast<std::uint64_t>(source.Size());
+        _mostPoints = std::max<std::uint64_t>(size / 5 + 1, MinimumRoom);
+
+        // The estimate: the file size over the average length of the first lines.
+        ZonCloudLineSource lines(LinePiece);
+        lines.Start(source, 0);
+        const char* first = nullptr;
+        const char* last = nullptr;
+        std::uint64_t sampled = 0;
+        while (sampled < SampleLines && lines.Next(first, last)) ++sampled;
+        const std::uint64_t average = sampled > 0 ? lines.NextOffset() / sampled : 0;
+        _estimate = average > 0 ? size / average : 0;
+
+        DecimalPointGuard guard;
+        lines.Start(source, 0);
+        while (!ReadPass(lines, guard.DecimalPoint())) {
+            // Too many lines not understood: once, try the other decimal point.
+            if (_decimalSwapped || !guard.Switch())
+                ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_TooManyUnknownData");
+            _decimalSwapped = true;
+            lines.Start(source, 0);
+        }
+        // Everything is in memory now.
+        CloseSource();
+    });
 
     if (_pointLines == 0) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_NoPointFound");
     _numberOfPoints = static_cast<int>(std::min<std::int64_t>(_pointLines, std::numeric_limits<int>::max()));
     _analysed = true;
 }
 
-bool ZonCloudReadPointLines::ReadPass(char decimalPoint, double ratio)
+bool ZonCloudReadPointLines::ReadPass(ZonCloudLineSource& lines, char decimalPoint)
 {
     static const ZonCloudScanFormat countFormat("%d");
 
@@ -113,24 +127,25 @@ bool ZonCloudReadPointLines::ReadPass(char decimalPoint, double ratio)
     _pointLines = 0;
     _dataStart = 0;
     ZonMathBox box;
-    double previousWhole = 1.0;
+    ZonCloudSampler sampler = ZonCloudSampler::InDouble(_samplingPercent);
     int unknownInRow = 0;
     bool firstLine = true;
 
-    char line[LineSize];
-    while (std::fgets(line, sizeof line, _file)) {
+    const char* first = nullptr;
+    const char* last = nullptr;
+    while (lines.Next(first, last)) {
         const bool isFirstLine = firstLine;
         firstLine = false;
         double xyz[3] = {0.0, 0.0, 0.0};
         unsigned char rgb[3] = {255, 255, 255};
-        if (!ScanLine(line, decimalPoint, xyz, rgb)) {
-            if (_pointLines == 0) _dataStart = ZonCloudReadTextTool::LineEnd(_file);
+        if (!ScanLine(first, last, decimalPoint, xyz, rgb)) {
+            if (_pointLines == 0) _dataStart = static_cast<long>(lines.NextOffset());
             int announced = 0;
-            if (isFirstLine && countFormat(line, decimalPoint, &announced) == 1 && announced >= 1) {
-                Reserve(static_cast<std::uint64_t>(announced));
+            if (isFirstLine && Scan(countFormat, first, last, decimalPoint, &announced) == 1 && announced >= 1) {
+                MakeRoom(static_cast<std::uint64_t>(announced));
                 continue;
             }
-            if (std::strstr(line, EndOfCloud)) break;
+            if (IsEndOfCloud(first, last)) break;
             if (++unknownInRow == UnknownLinesBeforeSwap) return false;
             continue;
         }
@@ -138,21 +153,19 @@ bool ZonCloudReadPointLines::ReadPass(char decimalPoint, double ratio)
         unknownInRow = 0;
         ++_pointLines;
         box.AddPoint(xyz[0], xyz[1], xyz[2]);
-        const double whole = std::trunc(static_cast<double>(_pointLines - 1) * ratio);
-        if (whole == previousWhole) continue;
-        previousWhole = whole;
+        if (!sampler.Keep()) continue;
 
-        if (_count >= std::numeric_limits<unsigned>::max()) ZonCloudOperErrorTool::ThrowInsufficientMemory();
-        if (_count == _capacity) Reserve(_capacity == 0 && _estimate != 0 ? _estimate : _capacity + GrowthStep);
-        if (_loadedAsDouble)
+        if (_count >= std::numeric_limits<unsigned>::max()) RaiseMemoryError();
+        if (_count == _capacity) MakeRoom(_capacity == 0 && _estimate != 0 ? _estimate : _capacity + GrowthStep);
+        if (_loadedAsDouble) {
             _pointsDouble.insert(_pointsDouble.end(), xyz, xyz + 3);
-        else
+        } else {
             _points.insert(_points.end(), {static_cast<float>(xyz[0]), static_cast<float>(xyz[1]),
                                            static_cast<float>(xyz[2])});
+        }
         if (_keepColors) _colors.insert(_colors.end(), rgb, rgb + 3);
         ++_count;
     }
-    if (std::ferror(_file)) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Input, nullptr);
     if (_pointLines > 0) _boundingBox = box;
     return true;
 }

@@ -1,9 +1,12 @@
 #pragma once
+#include <cstddef>
 #include <cstdint>
 #include <vector>
 
 #include "ZonCldExport.h"
+#include "ZonCloudLineSource.h"
 #include "ZonCloudReadFile.h"
+#include "ZonCloudScanFormat.h"
 
 // Base of the readers of text files with one point per line: an optional
 // first line with the number of points, then point lines up to an optional
@@ -26,16 +29,28 @@ public:
 protected:
     explicit ZonCloudReadPointLines(const ZonUnicodeString& fileName);
 
-    // Scans one line in the precision being loaded: false when it is no point.
-    // rgb is the point's colour, used when colours are kept.
-    virtual bool ScanLine(const char* line, char decimalPoint, double xyz[3], unsigned char rgb[3]) = 0;
+    // Scans the line [first, last) in the precision being loaded: false when
+    // it is no point. rgb is the point's colour, used when colours are kept.
+    virtual bool ScanLine(const char* first, const char* last, char decimalPoint, double xyz[3],
+                          unsigned char rgb[3]) = 0;
     // Forgets what was loaded; a format that keeps more forgets that too.
     virtual void Discard();
     void AnalyseFile() override;
     void Load(bool asDouble);
 
-    static constexpr int LineSize = 512;  // lines of at most 511 characters
-    static constexpr const char* EndOfCloud = "**end cloud**";
+    // `format` over [first, last), which ends early at a NUL as a C string would.
+    template <class... T>
+    static int Scan(const ZonCloudScanFormat& format, const char* first, const char* last, char decimalPoint,
+                    T*... args)
+    {
+        void* const pointers[sizeof...(T) + 1] = {static_cast<void*>(args)..., nullptr};
+        return format.Scan(first, last, decimalPoint, pointers);
+    }
+    // True when the line's text (up to a NUL) holds "**end cloud**".
+    static bool IsEndOfCloud(const char* first, const char* last);
+
+    // Lines are cut after 511 characters; the rest is read as the next line.
+    static constexpr std::size_t LinePiece = ZonCloudLineSource::FgetsPiece;
 
     bool _keepColors = false;
     bool _loadedAsDouble = false;
@@ -48,8 +63,8 @@ protected:
 
 private:
     // One pass over the file; false when it must start again with the other decimal point.
-    bool ReadPass(char decimalPoint, double ratio);
-    void Reserve(std::uint64_t capacity);
+    bool ReadPass(ZonCloudLineSource& lines, char decimalPoint);
+    void MakeRoom(std::uint64_t capacity);
 
     bool _decimalSwapped = false;
     std::uint64_t _capacity = 0;

@@ -2,8 +2,8 @@
 
 std::uint64_t ZonCloudSampler::CountKept(std::uint64_t n) const
 {
-    ZonCloudSampler walker(step_ * 100.0f);
-    walker.step_ = step_;
+    ZonCloudSampler walker(*this);
+    walker.Restart();
     std::uint64_t kept = 0;
     for (std::uint64_t i = 0; i < n; ++i) kept += walker.Keep() ? 1 : 0;
     return kept;
