@@ -6,6 +6,14 @@
 #include "ZonCloudPrintFormat.h"
 #include "ZonCloudReadNLSTool.h"
 
+namespace {
+[[noreturn]] void RaiseSystemError(int reason)
+{
+    errno = reason != 0 ? reason : EIO;
+    ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, nullptr);
+}
+}  // namespace
+
 ZonCloudOutputFile::~ZonCloudOutputFile()
 {
     if (!_stream) return;
@@ -27,16 +35,17 @@ bool ZonCloudOutputFile::Open(const ZonUnicodeString& name, const char* mode)
     return _stream != nullptr;
 }
 
+// Called only while the file is being written (its stream open, or being
+// closed): what is on disk is unfinished. A call with no stream open raises
+// EBADF instead and leaves alone a file that was closed complete.
 void ZonCloudOutputFile::Fail()
 {
     // The system's reason first: closing and removing may change errno.
-    const int reason = errno != 0 ? errno : EIO;
-    if (_stream) std::fclose(_stream);
-    _stream = nullptr;
+    const int reason = errno;
+    if (_stream) std::fclose(std::exchange(_stream, nullptr));
     std::remove(_name.c_str());
     _failed = true;
-    errno = reason;
-    ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, nullptr);
+    RaiseSystemError(reason);
 }
 
 void ZonCloudOutputFile::Print(const char* format, ...)
@@ -49,44 +58,46 @@ void ZonCloudOutputFile::Print(const char* format, ...)
 
 void ZonCloudOutputFile::PrintV(const char* format, std::va_list args)
 {
-    if (!_stream) {
-        errno = EBADF;
-        Fail();
-    }
+    if (!_stream) RaiseSystemError(EBADF);
     errno = 0;
     if (ZonPrintFileV(_stream, format, args) < 0) Fail();
 }
 
 void ZonCloudOutputFile::Write(const void* data, std::size_t size)
 {
-    errno = _stream ? 0 : EBADF;
-    if (!_stream || std::fwrite(data, 1, size, _stream) != size) Fail();
+    if (!_stream) RaiseSystemError(EBADF);
+    errno = 0;
+    if (std::fwrite(data, 1, size, _stream) != size) Fail();
 }
 
 void ZonCloudOutputFile::Read(void* data, std::size_t size)
 {
-    errno = _stream ? 0 : EBADF;
-    if (!_stream || std::fread(data, 1, size, _stream) != size) Fail();
+    if (!_stream) RaiseSystemError(EBADF);
+    errno = 0;
+    if (std::fread(data, 1, size, _stream) != size) Fail();
 }
 
 void ZonCloudOutputFile::Seek(long offset, int whence)
 {
-    errno = _stream ? 0 : EBADF;
-    if (!_stream || std::fseek(_stream, offset, whence) != 0) Fail();
+    if (!_stream) RaiseSystemError(EBADF);
+    errno = 0;
+    if (std::fseek(_stream, offset, whence) != 0) Fail();
 }
 
 long ZonCloudOutputFile::Tell()
 {
-    errno = _stream ? 0 : EBADF;
-    const long offset = _stream ? std::ftell(_stream) : -1;
+    if (!_stream) RaiseSystemError(EBADF);
+    errno = 0;
+    const long offset = std::ftell(_stream);
     if (offset < 0) Fail();
     return offset;
 }
 
 void ZonCloudOutputFile::Flush()
 {
-    errno = _stream ? 0 : EBADF;
-    if (!_stream || std::fflush(_stream) != 0 || std::ferror(_stream)) Fail();
+    if (!_stream) RaiseSystemError(EBADF);
+    errno = 0;
+    if (std::fflush(_stream) != 0 || std::ferror(_stream)) Fail();
 }
 
 void ZonCloudOutputFile::Close()
@@ -95,5 +106,6 @@ void ZonCloudOutputFile::Close()
     // A write refused earlier leaves the error flag even when this flush succeeds.
     Flush();
     // The stream is gone whatever fclose answers; a failure still removes the file.
+    errno = 0;
     if (std::fclose(std::exchange(_stream, nullptr)) != 0) Fail();
 }
