@@ -1,12 +1,12 @@
 #include "ZonCldSTLOutputDocument.h"
 
 #include "ZonCldSTLBinaryFormat.h"
+#include "ZonCloudExportOutcome.h"
 #include "ZonCloudPrintFormat.h"
 #include "ZonCloudReadNLSTool.h"
 #include "ZonCloudScanFormat.h"
 #include "ZonIExchInstance.h"
 #include "ZonIExchProductStructure.h"
-#include "ZonIReporter.h"
 #include "ZonObjectRegistry.h"
 
 namespace {
@@ -310,18 +310,6 @@ ZonHResult ZonCldSTLOutputDocument::Release()
     if (!_meshFound && !_fileName.IsNull()) std::remove(_fileName.c_str());
     const char* code = GetOutcomeCode();
     if (!code) return ZON_S_OK;
-    ZonSession* session = ZonSession::GetPtrSession();
-    const ZonIReporter_var reporter = session ? session->GetReporter() : nullptr;
-    if (!reporter) return ZON_S_OK;
-    const int level = GetOutcomeLevel();
-    ZonError outcome(std::string("ZonCldExportCmd.") + code, "ZonCldExportCmd");
-    outcome.SetSeverity(level);
-    outcome.SetParameters({_fileName.ToUtf8()});
-    ZonError detail(_facetsWritten ? "ZonCldExportCmd.Partial" : "ZonCldExportCmd.Empty", "ZonCldExportCmd");
-    detail.SetSeverity(level);
-    detail.SetParameters({_fileName.ToUtf8()});
-    reporter->BeginReport();
-    reporter->Report(outcome);
-    reporter->Report(detail);
+    ZonCloudExportOutcome::Report({code, _facetsWritten ? "Partial" : "Empty"}, _fileName, GetOutcomeLevel());
     return ZON_S_OK;
 }

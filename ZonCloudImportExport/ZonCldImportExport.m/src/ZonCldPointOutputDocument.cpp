@@ -1,9 +1,9 @@
 #include "ZonCldPointOutputDocument.h"
 
+#include "ZonCloudExportOutcome.h"
 #include "ZonCloudReadNLSTool.h"
 #include "ZonCloudScanFormat.h"
 #include "ZonExchPointWalker.h"
-#include "ZonIReporter.h"
 
 ZonHResult ZonCldPointOutputDocument::SetFileName(const ZonUnicodeString& fileName)
 {
@@ -52,14 +52,7 @@ ZonHResult ZonCldPointOutputDocument::Release()
 {
     Close();
     if (_output.HasFailed()) return ZON_E_FAIL;
-    ZonSession* session = ZonSession::GetPtrSession();
-    const ZonIReporter_var reporter = session ? session->GetReporter() : nullptr;
-    if (!reporter) return ZON_S_OK;
-    const char* code = _written ? "ZonCldExportCmd.ERR_FILESUCCESSFULL" : "ZonCldExportCmd.ERR_NoActivePoints";
-    ZonError outcome(code, "ZonCldExportCmd");
-    outcome.SetSeverity(_written ? 1 : 4);
-    outcome.SetParameters({_fileName.ToUtf8()});
-    reporter->BeginReport();
-    reporter->Report(outcome);
+    if (_written) ZonCloudExportOutcome::Report("ERR_FILESUCCESSFULL", _fileName, ZonCloudExportOutcome::Written);
+    else ZonCloudExportOutcome::Report("ERR_NoActivePoints", _fileName, ZonCloudExportOutcome::NotWritten);
     return ZON_S_OK;
 }
