@@ -17,7 +17,10 @@ class ZonGeoFactoryProtected;
 
 // Offers the settings that formats declare as command-line options and writes
 // the ones given into the settings store, knowing no format. Settings that
-// share an option name make one option; a setting without one is not offered.
+// share an option name make one option (the first declaration gives its kind
+// and help); a setting without one is not offered. A flag or a number stores
+// its value in every key of its option; a text option with several keys
+// takes one value per key, in order.
 class ZonToolSettingOptions {
 public:
     // Adds the options not added yet.

@@ -53,8 +53,8 @@ void ZonToolSettingOptions::AddTo(CLI::App& command, const std::vector<ZonCloudS
                 entry->option = command.add_option(name, entry->integer, first.help);
                 break;
             case ZonCloudSetting::Kind::Number: entry->option = command.add_option(name, entry->number, first.help); break;
+            case ZonCloudSetting::Kind::Position: entry->option = command.add_option(name, entry->text, first.help); break;
             case ZonCloudSetting::Kind::Text:
-            case ZonCloudSetting::Kind::Position:
                 entry->option = several ? command.add_option(name, entry->texts, first.help)->expected(
                                               static_cast<int>(entry->settings.size()))
                                         : command.add_option(name, entry->text, first.help);
@@ -86,9 +86,14 @@ void ZonToolSettingOptions::ApplyToSettings() const
                 if (!entry->flag) break;
                 for (const ZonCloudSetting& setting : entry->settings) store.SetValue(setting.key, setting.given);
                 break;
-            case ZonCloudSetting::Kind::Integer: store.SetInt(first.key, entry->integer); break;
+            case ZonCloudSetting::Kind::Integer:
+                for (const ZonCloudSetting& setting : entry->settings) store.SetInt(setting.key, entry->integer);
+                break;
             // As many digits as bring back the same double.
-            case ZonCloudSetting::Kind::Number: store.SetValue(first.key, ZonFormat("%.17g", entry->number)); break;
+            case ZonCloudSetting::Kind::Number:
+                for (const ZonCloudSetting& setting : entry->settings)
+                    store.SetValue(setting.key, ZonFormat("%.17g", entry->number));
+                break;
             case ZonCloudSetting::Kind::Text:
                 if (entry->settings.size() == 1) {
                     store.SetValue(first.key, entry->text);
@@ -100,7 +105,8 @@ void ZonToolSettingOptions::ApplyToSettings() const
             case ZonCloudSetting::Kind::Position: {
                 const auto choices = Choices(first.choices);
                 const auto at = std::find(choices.begin(), choices.end(), entry->text);
-                store.SetInt(first.key, static_cast<int>(at - choices.begin()));
+                for (const ZonCloudSetting& setting : entry->settings)
+                    store.SetInt(setting.key, static_cast<int>(at - choices.begin()));
                 break;
             }
         }
