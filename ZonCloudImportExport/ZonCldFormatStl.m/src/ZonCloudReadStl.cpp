@@ -501,12 +501,7 @@ void ZonCloudReadStl::ReadBinaryMesh()
 const float* ZonCloudReadStl::FloatVertices()
 {
     if (_meshInDouble && _vertices.size() != 3 * _distinctCount) {
-        try {
-            _vertices.assign(_verticesDouble.begin(), _verticesDouble.end());
-        } catch (const std::bad_alloc&) {
-            _vertices = {};
-            RaiseMemoryError();
-        }
+        Allocating([this] { _vertices.assign(_verticesDouble.begin(), _verticesDouble.end()); });
     }
     return _vertices.data();
 }
@@ -514,12 +509,7 @@ const float* ZonCloudReadStl::FloatVertices()
 const double* ZonCloudReadStl::DoubleVertices()
 {
     if (!_meshInDouble && _verticesDouble.size() != 3 * _distinctCount) {
-        try {
-            _verticesDouble.assign(_vertices.begin(), _vertices.end());
-        } catch (const std::bad_alloc&) {
-            _verticesDouble = {};
-            RaiseMemoryError();
-        }
+        Allocating([this] { _verticesDouble.assign(_vertices.begin(), _vertices.end()); });
     }
     return _verticesDouble.data();
 }
@@ -593,16 +583,14 @@ const unsigned* ZonCloudReadStl::GetTrianglesInBox(const ZonMathBox& box, unsign
         return _triangles.data();
     }
     if (!_sub.IsFor(box)) {
-        try {
+        Allocating([&] {
             if (_meshInDouble)
                 _sub.Compute(box, _boundingBox, _verticesDouble.data(), _distinctCount, _triangles.data(),
                              _triangles.size() / 3);
             else
                 _sub.Compute(box, _boundingBox, _vertices.data(), _distinctCount, _triangles.data(),
                              _triangles.size() / 3);
-        } catch (const std::bad_alloc&) {
-            RaiseMemoryError();
-        }
+        });
     }
     vertices = _sub.Vertices().data();
     vertexCount = _sub.VertexCount();

@@ -1,20 +1,18 @@
 #include "ZonCloudReadFile.h"
 
-#include <cerrno>
-#include <cstdlib>
 #include <cxxabi.h>
-#include <typeinfo>
+
+#include <cstdlib>
 #include <new>
 #include <type_traits>
-
-#include <sys/stat.h>
+#include <typeinfo>
 
 #include "ZonCloudOperErrorTool.h"
 #include "ZonCloudReadNLSTool.h"
 
 ZonCloudReadFile::ZonCloudReadFile(const ZonUnicodeString& fileName) : _fileName(fileName) {}
 
-ZonCloudReadFile::~ZonCloudReadFile() { CloseFile(); }
+ZonCloudReadFile::~ZonCloudReadFile() = default;
 
 void ZonCloudReadFile::GetFileName(ZonUnicodeString& name) { name = _fileName; }
 
@@ -133,20 +131,6 @@ bool ZonCloudReadFile::IsInQueryBox(double x, double y, double z, const ZonMathB
     return true;
 }
 
-namespace {
-template <class T>
-void ResizeOrThrow(std::vector<T>& v, std::size_t n)
-{
-    try {
-        v.resize(n);
-    } catch (const std::bad_alloc&) {
-        ZonCloudOperErrorTool::ThrowInsufficientMemory();
-    } catch (const std::length_error&) {
-        ZonCloudOperErrorTool::ThrowInsufficientMemory();
-    }
-}
-}  // namespace
-
 template <class T>
 const T* ZonCloudReadFile::PointsInBox(const ZonMathBox& box, unsigned& count, const T* points, unsigned n,
                                        std::vector<T>& cache, bool& hasCache)
@@ -182,7 +166,7 @@ const T* ZonCloudReadFile::PointsInBox(const ZonMathBox& box, unsigned& count, c
 
     _cachedBox = box;
     _cachedBoxEmpty = false;
-    ResizeOrThrow(cache, 3 * static_cast<std::size_t>(n));
+    Resize(cache, 3 * static_cast<std::size_t>(n));
     hasCache = true;
     std::size_t kept = 0;
     for (unsigned i = 0; i < n; ++i) {
@@ -222,7 +206,7 @@ const T* ZonCloudReadFile::ScanPointsInBox(const ZonMathBox& box, unsigned& coun
     if (!points || n == 0) return nullptr;
     ZonMathBox fileBox;
     GetBoundingBox(fileBox);
-    ResizeOrThrow(cache, 3 * static_cast<std::size_t>(n));
+    Resize(cache, 3 * static_cast<std::size_t>(n));
     hasCache = true;
     std::size_t kept = 0;
     for (unsigned i = 0; i < n; ++i) {
@@ -283,7 +267,7 @@ const T* ZonCloudReadFile::GridPointsInBox(const ZonMathBox& box, unsigned& coun
             return nullptr;
         }
         if (n == 0) continue;  // empty rows are skipped until content or the end
-        ResizeOrThrow(_cachedValidity, n);
+        Resize(_cachedValidity, n);
         for (unsigned i = 0; i < n; ++i) {
             const T* p = points + 3 * static_cast<std::size_t>(i);
             const bool wasValid = gridValid == nullptr || gridValid[i] != 0;
@@ -341,35 +325,6 @@ ZonCloudByteSource& ZonCloudReadFile::Source()
     else
         _source.Open(_fileName.ToUtf8());
     return _source;
-}
-
-void ZonCloudReadFile::OpenFile()
-{
-    CloseFile();
-    errno = 0;
-    _file = std::fopen(_fileName.c_str(), "rb");
-    if (!_file) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, nullptr);
-    struct stat info {};
-    if (fstat(fileno(_file), &info) == 0 && S_ISDIR(info.st_mode)) {
-        CloseFile();
-        errno = EISDIR;
-        ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, nullptr);
-    }
-}
-
-void ZonCloudReadFile::RewindFile()
-{
-    errno = 0;
-    if (!_file || std::fseek(_file, 0, SEEK_SET) != 0) {
-        if (errno == 0) errno = EBADF;
-        ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Input, nullptr);
-    }
-}
-
-void ZonCloudReadFile::CloseFile()
-{
-    if (_file) std::fclose(_file);
-    _file = nullptr;
 }
 
 void ZonCloudReadFile::RaiseMemoryError() const

@@ -1,6 +1,5 @@
 #pragma once
 #include <cstddef>
-#include <cstdio>
 #include <new>
 #include <stdexcept>
 #include <vector>
@@ -85,11 +84,6 @@ protected:
     // system's message.
     ZonCloudByteSource& Source();
     void CloseSource() { _source.Close(); }
-    // Stream access of the readers not yet on the byte source; goes once they are.
-    void OpenFile();
-    void RewindFile();
-    void CloseFile();
-    FILE* _file = nullptr;
     // Runs `work`, which reads the source: any failure closes it, and memory
     // exhaustion raises the memory error.
     template <class Work>
@@ -115,9 +109,25 @@ protected:
     template <class T>
     void Reserve(std::vector<T>& v, std::uint64_t n) const
     {
-        try {
+        Allocating([&] {
             if (n > v.max_size()) RaiseMemoryError();
             v.reserve(static_cast<std::size_t>(n));
+        });
+    }
+    // The same for n elements in use.
+    template <class T>
+    void Resize(std::vector<T>& v, std::uint64_t n) const
+    {
+        Allocating([&] {
+            if (n > v.max_size()) RaiseMemoryError();
+            v.resize(static_cast<std::size_t>(n));
+        });
+    }
+    template <class Allocation>
+    void Allocating(Allocation&& allocation) const
+    {
+        try {
+            allocation();
         } catch (const std::bad_alloc&) {
             RaiseMemoryError();
         } catch (const std::length_error&) {
