@@ -2,12 +2,8 @@
 // read in both precisions with a sampling, a precision and an order picked by
 // the input's first byte, end in points or a catalog error.
 #pragma once
-#include <unistd.h>
-
 #include <cstddef>
 #include <cstdint>
-#include <cstdio>
-#include <string>
 
 #include "ZonError.h"
 
@@ -22,20 +18,16 @@ float Sum(const T* values, unsigned count)
     return sum;
 }
 
-// `configure` sets what only this format has, from the first byte.
+// `configure` sets what only this format has, from the first byte. `name` is
+// the reader's file name; the bytes are read from memory.
 template <class Reader, class Configure>
-int ReadTextCloud(const std::uint8_t* data, std::size_t size, const char* extension, Configure configure)
+int ReadTextCloud(const std::uint8_t* data, std::size_t size, const char* name, Configure configure)
 {
     if (size > 1 << 16) return 0;
-    static const std::string path = "/tmp/zon_fuzz_" + std::to_string(getpid()) + extension;
-    FILE* out = std::fopen(path.c_str(), "wb");
-    if (!out) __builtin_trap();
-    if (size) std::fwrite(data, 1, size, out);
-    std::fclose(out);
-
     const std::uint8_t choice = size ? data[0] : 0;
     try {
-        Reader reader(path);
+        Reader reader{ZonUnicodeString(name)};
+        reader.SetSourceMemory(data, size);
         reader.SetSamplingPercent(static_cast<float>(choice % 101));
         reader.SetDoublePrecision(choice & 0x80);
         configure(reader, choice);

@@ -1,5 +1,5 @@
 // Fuzzes the ASCII user format reader: the input's first line is the FDF, the
-// rest the data file; its first byte also picks the sampling and precision.
+// rest the data; its first byte also picks the sampling and precision.
 #include <cstddef>
 #include <cstdint>
 #include <cstdio>
@@ -29,17 +29,17 @@ void WriteFile(const std::string& path, const std::uint8_t* data, std::size_t si
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size)
 {
     if (size > 1 << 16) return 0;
+    // The FDF can only be named by a path; the data is read from memory.
     static const std::string fdfPath = TempPath("columns.fdf");
-    static const std::string dataPath = TempPath("data.asc_fmt");
     std::size_t cut = 0;
     while (cut < size && data[cut] != '\n') ++cut;
     const std::size_t fdfSize = cut < size ? cut + 1 : size;
     WriteFile(fdfPath, data, fdfSize);
-    WriteFile(dataPath, data + fdfSize, size - fdfSize);
 
     const std::uint8_t choice = size ? data[0] : 0;
     try {
-        ZonCloudReadAsciiUserFormat reader(dataPath);
+        ZonCloudReadAsciiUserFormat reader{ZonUnicodeString("fuzz.asc_fmt")};
+        reader.SetSourceMemory(data + fdfSize, size - fdfSize);
         reader.SetSamplingPercent(static_cast<float>(choice % 101));
         reader.SetDoublePrecision(choice & 0x80);
         reader.SetKeepColors(!(choice & 0x40));

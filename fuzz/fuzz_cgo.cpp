@@ -4,5 +4,5 @@
 
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size)
 {
-    return zonfuzz::ReadTextCloud<ZonCloudReadCgoAscii>(data, size, ".cgo", [](ZonCloudReadCgoAscii&, std::uint8_t) {});
+    return zonfuzz::ReadTextCloud<ZonCloudReadCgoAscii>(data, size, "fuzz.cgo", [](ZonCloudReadCgoAscii&, std::uint8_t) {});
 }

@@ -5,7 +5,7 @@
 
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size)
 {
-    return zonfuzz::ReadTextCloud<ZonCloudReadLeica>(data, size, ".asc_rgb", [](ZonCloudReadLeica& reader, std::uint8_t choice) {
+    return zonfuzz::ReadTextCloud<ZonCloudReadLeica>(data, size, "fuzz.asc_rgb", [](ZonCloudReadLeica& reader, std::uint8_t choice) {
         reader.SetKeepColors(!(choice & 0x40));
     });
 }

@@ -357,7 +357,7 @@ void ZonCloudReadAsciiUserFormat::ParseLine(const char* first, const char* last,
                         quoted.append(next.text, std::find(next.text, next.End(), '"'));
                         break;
                     }
-                    quoted.append(next.text, next.length);
+                    quoted.append(next.text, next.End());
                 }
             }
         }
