@@ -35,7 +35,7 @@ std::string EscapePercent(const std::string& text)
 }  // namespace
 
 ZonCloudWriteAsciiUserFormat::ZonCloudWriteAsciiUserFormat(const ZonUnicodeString& fileName)
-    : ZonCloudWriteFile(fileName)
+    : ZonCloudWritePointLines(fileName)
 {
 }
 
@@ -160,7 +160,7 @@ void ZonCloudWriteAsciiUserFormat::BeginWritePoints(const unsigned& count)
     _expected = count;
 }
 
-void ZonCloudWriteAsciiUserFormat::PointLine(double x, double y, double z, const unsigned char* rgb)
+void ZonCloudWriteAsciiUserFormat::WritePointLine(double x, double y, double z, const unsigned char* rgb)
 {
     if (!_file.IsOpen() || _expected == 0) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_Failure");
     if (_rowSeparatorGiven) Emit(_pointSeparator);
@@ -179,22 +179,6 @@ void ZonCloudWriteAsciiUserFormat::PointLine(double x, double y, double z, const
     --_expected;
 }
 
-void ZonCloudWriteAsciiUserFormat::WritePoint(const float xyz[3]) { PointLine(xyz[0], xyz[1], xyz[2], nullptr); }
-
-void ZonCloudWriteAsciiUserFormat::WritePointDouble(const double xyz[3])
-{
-    PointLine(xyz[0], xyz[1], xyz[2], nullptr);
-}
-
-void ZonCloudWriteAsciiUserFormat::WritePointColor(const float xyz[3], const unsigned char rgb[3])
-{
-    PointLine(xyz[0], xyz[1], xyz[2], rgb);
-}
-
-void ZonCloudWriteAsciiUserFormat::WritePointColorDouble(const double xyz[3], const unsigned char rgb[3])
-{
-    PointLine(xyz[0], xyz[1], xyz[2], rgb);
-}
 
 void ZonCloudWriteAsciiUserFormat::EndWritePoints()
 {

@@ -2,8 +2,7 @@
 #include <cstdint>
 #include <string>
 
-#include "ZonCloudWriteFile.h"
-#include "ZonICloudWritePointFile.h"
+#include "ZonCloudWritePointLines.h"
 
 // Writes points as fixed-width text columns for the ASCII user format: an
 // optional header and name, an optional point number column, optional column
@@ -24,7 +23,7 @@
 //   6 ColumWidth    column width W, an integer
 //   7 DecimalPlace  decimal places D, an integer
 // A list of another length is ignored.
-class ZON_CLD_API ZonCloudWriteAsciiUserFormat : public ZonCloudWriteFile, public ZonICloudWritePointFile {
+class ZON_CLD_API ZonCloudWriteAsciiUserFormat : public ZonCloudWritePointLines {
 public:
     explicit ZonCloudWriteAsciiUserFormat(const ZonUnicodeString& fileName);
 
@@ -38,10 +37,6 @@ public:
 
     // ZonICloudWritePointFile
     void BeginWritePoints(const unsigned& count) override;
-    void WritePoint(const float xyz[3]) override;
-    void WritePointDouble(const double xyz[3]) override;
-    void WritePointColor(const float xyz[3], const unsigned char rgb[3]) override;
-    void WritePointColorDouble(const double xyz[3], const unsigned char rgb[3]) override;
     void EndWritePoints() override;
 
     // The printf format of a point line for the current settings.
@@ -49,11 +44,13 @@ public:
     // "!" followed by the row separator text taken four times the column width.
     std::string RowSeparatorLine() const;
 
+protected:
+    void WritePointLine(double x, double y, double z, const unsigned char* rgb) override;
+
 private:
     void WriteHeader();
     // Builds the point line templates and the row separator for the settings in force.
     void PrepareLines();
-    void PointLine(double x, double y, double z, const unsigned char* rgb);
     // Writes text with CR LF line ends.
     void Emit(const std::string& text);
 

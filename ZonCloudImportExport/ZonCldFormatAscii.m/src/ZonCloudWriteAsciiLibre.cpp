@@ -7,7 +7,7 @@ namespace {
 constexpr int TotalWidth = 12;
 }  // namespace
 
-ZonCloudWriteAsciiLibre::ZonCloudWriteAsciiLibre(const ZonUnicodeString& fileName) : ZonCloudWriteFile(fileName) {}
+ZonCloudWriteAsciiLibre::ZonCloudWriteAsciiLibre(const ZonUnicodeString& fileName) : ZonCloudWritePointLines(fileName) {}
 
 void ZonCloudWriteAsciiLibre::WriteHeaderStart()
 {
@@ -45,25 +45,11 @@ void ZonCloudWriteAsciiLibre::CheckPointExpected()
 
 void ZonCloudWriteAsciiLibre::PointLine(double x, double y, double z) { Print("X %f Y %f Z %f\n", x, y, z); }
 
-void ZonCloudWriteAsciiLibre::WritePoint(const float xyz[3])
+void ZonCloudWriteAsciiLibre::WritePointLine(double x, double y, double z, const unsigned char*)
 {
     CheckPointExpected();
-    PointLine(xyz[0], xyz[1], xyz[2]);
+    PointLine(x, y, z);
     --_expected;
-}
-
-void ZonCloudWriteAsciiLibre::WritePointDouble(const double xyz[3])
-{
-    CheckPointExpected();
-    PointLine(xyz[0], xyz[1], xyz[2]);
-    --_expected;
-}
-
-void ZonCloudWriteAsciiLibre::WritePointColor(const float xyz[3], const unsigned char*) { WritePoint(xyz); }
-
-void ZonCloudWriteAsciiLibre::WritePointColorDouble(const double xyz[3], const unsigned char*)
-{
-    WritePointDouble(xyz);
 }
 
 void ZonCloudWriteAsciiLibre::End(Kind kind)

@@ -1,8 +1,7 @@
 #pragma once
 #include <cstdint>
 
-#include "ZonCloudWriteFile.h"
-#include "ZonICloudWritePointFile.h"
+#include "ZonCloudWritePointLines.h"
 #include "ZonICloudWriteScanFile.h"
 
 // Writes clouds and scans as free ASCII text: "X %f Y %f Z %f" lines under a
@@ -10,9 +9,7 @@
 // free ASCII reader reads the file back (as scans with the delimiters G08 and
 // G09, as a cloud without them). In multi-part mode several clouds and scans
 // go into one file whose header total is filled in at the end.
-class ZON_CLD_API ZonCloudWriteAsciiLibre : public ZonCloudWriteFile,
-                                            public ZonICloudWritePointFile,
-                                            public ZonICloudWriteScanFile {
+class ZON_CLD_API ZonCloudWriteAsciiLibre : public ZonCloudWritePointLines, public ZonICloudWriteScanFile {
 public:
     explicit ZonCloudWriteAsciiLibre(const ZonUnicodeString& fileName);
 
@@ -22,11 +19,6 @@ public:
 
     // ZonICloudWritePointFile
     void BeginWritePoints(const unsigned& count) override;
-    void WritePoint(const float xyz[3]) override;
-    void WritePointDouble(const double xyz[3]) override;
-    // The format has no colours: the point alone is written.
-    void WritePointColor(const float xyz[3], const unsigned char rgb[3]) override;
-    void WritePointColorDouble(const double xyz[3], const unsigned char rgb[3]) override;
     void EndWritePoints() override;
 
     // ZonICloudWriteScanFile
@@ -34,6 +26,10 @@ public:
     void WriteScan(const float* points, const unsigned& count) override;
     void WriteScanDouble(const double* points, const unsigned& count) override;
     void EndWriteScans() override;
+
+protected:
+    // The format has no colours: the point alone is written.
+    void WritePointLine(double x, double y, double z, const unsigned char* rgb) override;
 
 private:
     enum Kind : std::int32_t { KindNone = 0, KindPoints = 1, KindScans = 2 };

@@ -7,7 +7,7 @@ namespace {
 constexpr const char* Placeholder = "            \n";
 }
 
-ZonCloudWriteCgoAscii::ZonCloudWriteCgoAscii(const ZonUnicodeString& fileName) : ZonCloudWriteFile(fileName) {}
+ZonCloudWriteCgoAscii::ZonCloudWriteCgoAscii(const ZonUnicodeString& fileName) : ZonCloudWritePointLines(fileName) {}
 
 ZonHResult ZonCloudWriteCgoAscii::BeginMultiWrite()
 {
@@ -45,25 +45,11 @@ void ZonCloudWriteCgoAscii::BeginWritePoints(const unsigned& count)
     _expected = count;
 }
 
-void ZonCloudWriteCgoAscii::PointLine(double x, double y, double z)
+void ZonCloudWriteCgoAscii::WritePointLine(double x, double y, double z, const unsigned char*)
 {
     if (!_file.IsOpen() || _expected == 0) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_Failure");
     Print("%f %f %f\n", x, y, z);
     --_expected;
-}
-
-void ZonCloudWriteCgoAscii::WritePoint(const float xyz[3]) { PointLine(xyz[0], xyz[1], xyz[2]); }
-
-void ZonCloudWriteCgoAscii::WritePointDouble(const double xyz[3]) { PointLine(xyz[0], xyz[1], xyz[2]); }
-
-void ZonCloudWriteCgoAscii::WritePointColor(const float xyz[3], const unsigned char*)
-{
-    PointLine(xyz[0], xyz[1], xyz[2]);
-}
-
-void ZonCloudWriteCgoAscii::WritePointColorDouble(const double xyz[3], const unsigned char*)
-{
-    PointLine(xyz[0], xyz[1], xyz[2]);
 }
 
 void ZonCloudWriteCgoAscii::EndWritePoints()

@@ -1,14 +1,13 @@
 #pragma once
 #include <cstdint>
 
-#include "ZonCloudWriteFile.h"
-#include "ZonICloudWritePointFile.h"
+#include "ZonCloudWritePointLines.h"
 
 // Writes Cgo ASCII point files: the number of points on the first line, one
 // "x y z" line per point, and "**end cloud**" at the end. In multi-part mode
 // the first line is a placeholder of twelve blanks that the total of all the
 // clouds overwrites when the file is completed.
-class ZON_CLD_API ZonCloudWriteCgoAscii : public ZonCloudWriteFile, public ZonICloudWritePointFile {
+class ZON_CLD_API ZonCloudWriteCgoAscii : public ZonCloudWritePointLines {
 public:
     explicit ZonCloudWriteCgoAscii(const ZonUnicodeString& fileName);
 
@@ -18,15 +17,13 @@ public:
 
     // ZonICloudWritePointFile; the format has no colours.
     void BeginWritePoints(const unsigned& count) override;
-    void WritePoint(const float xyz[3]) override;
-    void WritePointDouble(const double xyz[3]) override;
-    void WritePointColor(const float xyz[3], const unsigned char rgb[3]) override;
-    void WritePointColorDouble(const double xyz[3], const unsigned char rgb[3]) override;
     void EndWritePoints() override;
 
-private:
-    void PointLine(double x, double y, double z);
+protected:
+    // The format has no colours: the point alone is written.
+    void WritePointLine(double x, double y, double z, const unsigned char* rgb) override;
 
+private:
     std::uint64_t _expected = 0;  // points still to come
     std::uint64_t _total = 0;     // points announced in multi-part mode
 };

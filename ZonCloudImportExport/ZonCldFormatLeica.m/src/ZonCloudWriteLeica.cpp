@@ -6,7 +6,7 @@ namespace {
 const unsigned char White[3] = {255, 255, 255};
 }
 
-ZonCloudWriteLeica::ZonCloudWriteLeica(const ZonUnicodeString& fileName) : ZonCloudWriteFile(fileName) {}
+ZonCloudWriteLeica::ZonCloudWriteLeica(const ZonUnicodeString& fileName) : ZonCloudWritePointLines(fileName) {}
 
 void ZonCloudWriteLeica::BeginWritePoints(const unsigned& count)
 {
@@ -19,25 +19,12 @@ void ZonCloudWriteLeica::BeginWritePoints(const unsigned& count)
     _expected = count;
 }
 
-void ZonCloudWriteLeica::PointLine(double x, double y, double z, const unsigned char rgb[3])
+void ZonCloudWriteLeica::WritePointLine(double x, double y, double z, const unsigned char* rgb)
 {
+    if (!rgb) rgb = White;
     if (!_file.IsOpen() || _expected == 0) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_Failure");
     Print("%f %f %f %d %d %d\n", x, y, z, rgb[0], rgb[1], rgb[2]);
     --_expected;
-}
-
-void ZonCloudWriteLeica::WritePoint(const float xyz[3]) { PointLine(xyz[0], xyz[1], xyz[2], White); }
-
-void ZonCloudWriteLeica::WritePointDouble(const double xyz[3]) { PointLine(xyz[0], xyz[1], xyz[2], White); }
-
-void ZonCloudWriteLeica::WritePointColor(const float xyz[3], const unsigned char rgb[3])
-{
-    PointLine(xyz[0], xyz[1], xyz[2], rgb);
-}
-
-void ZonCloudWriteLeica::WritePointColorDouble(const double xyz[3], const unsigned char rgb[3])
-{
-    PointLine(xyz[0], xyz[1], xyz[2], rgb);
 }
 
 void ZonCloudWriteLeica::EndWritePoints()

@@ -300,7 +300,6 @@ void ZonCloudReadFile::SetSourceMemory(const void* data, std::size_t size)
     CloseSource();
     _memory = data;
     _memorySize = size;
-    Reanalyse();
 }
 
 void ZonCloudReadFile::Analyse()

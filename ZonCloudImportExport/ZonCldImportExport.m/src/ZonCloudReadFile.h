@@ -67,7 +67,8 @@ public:
     static bool IsInQueryBox(double x, double y, double z, const ZonMathBox& query, const ZonMathBox& file);
 
     // Reads `size` bytes at `data` instead of the file (archive members, fuzz
-    // inputs); the caller keeps them alive as long as the reader.
+    // inputs); the caller keeps them alive as long as the reader. Called
+    // before the first question: what was read from the file stays read.
     void SetSourceMemory(const void* data, std::size_t size);
 
 protected:
