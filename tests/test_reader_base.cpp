@@ -75,6 +75,28 @@ TEST(Sampling, KeepsByWholePartOfIndexTimesRate)
     EXPECT_EQ(ZonCloudSampler(100.0f).CountKept((1u << 24) + 10), (1u << 24) + 10);
 }
 
+// The readers that take k * r in double keep other points than the float
+// rule for some k and r: at 70 %, 10 * 0.7f is 7 in float but 6.99999988 in double.
+TEST(Sampling, InDoubleTakesTheProductInDouble)
+{
+    ZonCloudSampler inFloat(70.0f);
+    ZonCloudSampler inDouble = ZonCloudSampler::InDouble(70.0f);
+    inFloat.Restart();
+    inDouble.Restart();
+    std::uint64_t keptInDouble = 0;
+    for (int k = 0; k < 11; ++k) {
+        const bool f = inFloat.Keep(), d = inDouble.Keep();
+        keptInDouble += d ? 1 : 0;
+        if (k == 10) {
+            EXPECT_TRUE(f);
+            EXPECT_FALSE(d);
+        } else {
+            EXPECT_EQ(f, d) << k;
+        }
+    }
+    EXPECT_EQ(ZonCloudSampler::InDouble(70.0f).CountKept(11), keptInDouble);
+}
+
 TEST(Sampling, RestartKeepsTheFirstPointOfEachRun)
 {
     ZonCloudSampler sampler(50.0f);

@@ -4,11 +4,17 @@
 #include <gtest/gtest.h>
 
 #include <cstring>
+#include <functional>
+#include <memory>
 #include <limits>
 
 #include "ZonCloudByteSource.h"
 #include "ZonCloudLineSource.h"
 #include "ZonCloudPolygonCursor.h"
+#include "ZonCloudReadAsciiLibre.h"
+#include "ZonCloudReadCgoAscii.h"
+#include "ZonCloudReadLeica.h"
+#include "ZonCloudReadStl.h"
 #include "ZonCloudSubMesh.h"
 #include "ZonTestFiles.h"
 
@@ -130,6 +136,47 @@ TEST_F(SourcesTest, StartComesBackToAnyOffsetAcrossBlocks)
     lines.Start(file_, 2);
     ASSERT_TRUE(lines.Next(line));
     EXPECT_EQ(line, "1\n");
+}
+
+// Every reader answers the same from memory (archive members, fuzz inputs) as from the file.
+TEST_F(SourcesTest, ReadersAnswerTheSameFromMemoryAsFromTheFile)
+{
+    std::string binaryStl(80, '\0');
+    const std::uint32_t one = 1;
+    binaryStl.append(reinterpret_cast<const char*>(&one), 4);
+    for (float v : {0.f, 0.f, 1.f, 0.f, 0.f, 0.f, 1.f, 0.f, 0.f, 0.f, 1.f, 0.f}) binaryStl.append(reinterpret_cast<const char*>(&v), 4);
+    binaryStl.append(2, '\0');
+    struct Case {
+        const char* name;
+        std::string bytes;
+        std::function<std::shared_ptr<ZonCloudReadFile>(const std::string&)> create;
+    };
+    const std::vector<Case> cases = {
+        {"binary stl", binaryStl, [](const std::string& f) { return std::make_shared<ZonCloudReadStl>(f); }},
+        {"text stl", "solid s\nfacet normal 0 0 1\nouter loop\nvertex 0 0 0\nvertex 1 0 0\nvertex 0 1.5 0\nendloop\nendfacet\n",
+         [](const std::string& f) { return std::make_shared<ZonCloudReadStl>(f); }},
+        {"free ascii", "1 2 3\r\n4,5 6 7\n8 9 10\n", [](const std::string& f) { return std::make_shared<ZonCloudReadAsciiLibre>(f); }},
+        {"rgb", "2\n1 2 3 10 20 30\n4 5 6 40 50 60\n", [](const std::string& f) { return std::make_shared<ZonCloudReadLeica>(f); }},
+        {"cgo", "2\n1 2 3\n4 5 6\n", [](const std::string& f) { return std::make_shared<ZonCloudReadCgoAscii>(f); }},
+    };
+    for (const Case& c : cases) {
+        const std::string path = Write("input", c.bytes);
+        const auto fromFile = c.create(path);
+        const auto fromMemory = c.create("not/a/file");
+        fromMemory->SetSourceMemory(c.bytes.data(), c.bytes.size());
+        for (const auto& reader : {fromFile, fromMemory}) reader->SetSamplingPercent(50.0f);
+        unsigned n1 = 0, n2 = 0;
+        const double* p1 = fromFile->GetPointsDouble(n1);
+        const double* p2 = fromMemory->GetPointsDouble(n2);
+        ASSERT_EQ(n1, n2) << c.name;
+        ASSERT_GT(n1, 0u) << c.name;
+        EXPECT_TRUE(std::equal(p1, p1 + 3 * n1, p2)) << c.name;
+        ZonMathBox b1, b2;
+        fromFile->GetBoundingBox(b1);
+        fromMemory->GetBoundingBox(b2);
+        EXPECT_TRUE(b1.IsSameAs(b2)) << c.name;
+        EXPECT_EQ(fromFile->GetTypeOfDigitization(), fromMemory->GetTypeOfDigitization()) << c.name;
+    }
 }
 
 TEST(LineSource, ChompRemovesOneLineEnd)
