@@ -73,24 +73,6 @@ void ZonCloudLineSource::Refill()
     }
 }
 
-bool ZonCloudLineSource::Next(const char*& first, const char*& last)
-{
-    if (!_source) return false;
-    if (_end - _begin <= _maxPiece && !_endOfSource) Refill();
-    const std::size_t available = _end - _begin;
-    if (available == 0) return false;
-    const char* start = _buffer.get() + _begin;
-    const std::size_t window = std::min(available, _maxPiece);
-    const void* newline = std::memchr(start, '\n', window);
-    const std::size_t length =
-        newline ? static_cast<std::size_t>(static_cast<const char*>(newline) - start) + 1 : window;
-    _lineOffset = NextOffset();
-    _begin += length;
-    first = start;
-    last = start + length;
-    return true;
-}
-
 bool ZonCloudLineSource::Next(std::string_view& line)
 {
     const char* first = nullptr;
