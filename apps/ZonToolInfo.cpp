@@ -44,6 +44,8 @@ ZonToolRun ZonToolAddInfo(CLI::App& app)
             {"sets", body->GetSetsOfScans().size()},
             {"scans", body->GetNumberOfScans()},
             {"grids", body->GetNumberOfGrids()},
+            {"rows", body->GetNumberOfGridRows()},
+            {"valid", body->GetNumberOfValidGridNodes()},
             {"polygons", body->GetPolygons().size()},
             {"triangles", body->GetNumberOfTriangles()},
             {"bbox", ZonToolBoxJson(body->GetBox())},
@@ -62,7 +64,8 @@ ZonToolRun ZonToolAddInfo(CLI::App& app)
                   << "points:    " << body->GetNumberOfPoints() << "\n"
                   << "sets:      " << body->GetSetsOfScans().size() << "\n"
                   << "scans:     " << body->GetNumberOfScans() << "\n"
-                  << "grids:     " << body->GetNumberOfGrids() << "\n"
+                  << "grids:     " << body->GetNumberOfGrids() << " (" << body->GetNumberOfGridRows() << " rows, "
+                  << body->GetNumberOfValidGridNodes() << " valid nodes)\n"
                   << "polygons:  " << body->GetPolygons().size() << "\n"
                   << "triangles: " << body->GetNumberOfTriangles() << "\n"
                   << "bbox:      " << summary["bbox"].dump() << "\n"

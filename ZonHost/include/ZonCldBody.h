@@ -29,6 +29,9 @@ public:
 
     std::size_t GetNumberOfScans() const;
     std::size_t GetNumberOfGrids() const;
+    // Rows of all grids, and their nodes that are not holes.
+    std::size_t GetNumberOfGridRows() const;
+    std::size_t GetNumberOfValidGridNodes() const;
     std::size_t GetNumberOfTriangles() const;
     // Cloud and scan points, valid grid points and polygon vertices.
     std::size_t GetNumberOfPoints() const;

@@ -16,6 +16,21 @@ std::size_t ZonCldBody::GetNumberOfGrids() const
     return n;
 }
 
+std::size_t ZonCldBody::GetNumberOfGridRows() const
+{
+    std::size_t n = 0;
+    for (const auto& set : _setsOfGrids)
+        for (const auto& grid : set->GetGrids()) n += grid->GetNumberOfRows();
+    return n;
+}
+
+std::size_t ZonCldBody::GetNumberOfValidGridNodes() const
+{
+    std::size_t n = 0;
+    for (const auto& set : _setsOfGrids) n += set->GetNumberOfValidPoints();
+    return n;
+}
+
 std::size_t ZonCldBody::GetNumberOfTriangles() const
 {
     std::size_t n = 0;

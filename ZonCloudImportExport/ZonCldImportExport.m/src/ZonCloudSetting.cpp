@@ -19,3 +19,10 @@ int ZonCloudSetting::ReadInt() const
     std::from_chars(fallback, fallback + std::strlen(fallback), value);
     return ZonCldSettings::Instance().GetInt(key, value);
 }
+
+double ZonCloudSetting::ReadDouble() const
+{
+    double value = 0.0;
+    std::from_chars(fallback, fallback + std::strlen(fallback), value);
+    return ZonCldSettings::Instance().GetDouble(key, value);
+}

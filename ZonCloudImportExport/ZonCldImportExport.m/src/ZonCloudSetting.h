@@ -31,6 +31,7 @@ struct ZON_CLD_API ZonCloudSetting {
     std::string Read() const;
     bool ReadBool() const;
     int ReadInt() const;
+    double ReadDouble() const;
 };
 
 // The settings a factory or an exporter declares, in the order it offers them.
