@@ -6,7 +6,7 @@
 
 #include <clocale>
 
-#include "AtosFiles.h"
+#include "ScannerFiles.h"
 #include "ZonCldSettings.h"
 #include "ZonCloudFactoryAtos.h"
 #include "ZonCloudReadAtos.h"
@@ -248,7 +248,7 @@ TEST_F(Atos, ToolImportsGridsWithTheMinimumQualityOption)
     // The valid nodes go to the point formats.
     EXPECT_EQ(Run("convert " + file + " " + zontest::Quote(Path("out.asc"))).status, 0);
     const std::string out = zontest::Slurp(Path("out.asc"));
-    EXPECT_EQ(std::count(out.begin(), out.end(), '\n'), 8);
+    EXPECT_NE(out.find("Total number of points = 8\n"), std::string::npos) << out;
 }
 
 }  // namespace
