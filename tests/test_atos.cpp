@@ -115,6 +115,24 @@ TEST_F(Atos, BinaryPatchesAreGridsWithHolesWhereQualityIsNotAboveTheMinimum)
     EXPECT_EQ(Validity(Grids(reader)[1]), (Flags{0, 0}));
 }
 
+TEST_F(Atos, RowsStoredOutOfOrderReadTheSame)
+{
+    // Column by column, every row's records span the whole patch.
+    const AtosPatch rows = Patch(40, 40, [](auto c, auto r) { return (c + r) % 3 ? 1.0 : 0.0; });
+    AtosPatch columns = rows;
+    for (std::size_t i = 0; i < columns.points.size(); ++i) columns.points[i] = rows.points[(i % 40) * 40 + i / 40];
+    ZonCloudReadAtos byRow(Write("rows.surf", AtosBinary({rows})));
+    ZonCloudReadAtos byColumn(Write("columns.surf", AtosBinary({columns})));
+    const auto expected = Grids(byRow);
+    const auto got = Grids(byColumn);
+    ASSERT_EQ(got.size(), 1u);
+    ASSERT_EQ(got[0].size(), 40u);
+    for (std::size_t r = 0; r < 40; ++r) {
+        EXPECT_EQ(got[0][r].points, expected[0][r].points) << r;
+        EXPECT_EQ(got[0][r].valid, expected[0][r].valid) << r;
+    }
+}
+
 TEST_F(Atos, RasterStepsDivideThePixelsAndAStepOfZeroIsOne)
 {
     for (std::uint32_t step : {0u, 1u, 2u}) {

@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <cstring>
+#include <limits>
 
 #include "DecimalPointGuard.h"
 #include "ZonCloudReadNLSTool.h"
@@ -219,6 +220,7 @@ void ZonCloudReadAtos::AnalyseBinary()
     if (descriptorSize < DescriptorSize || _recordSize < RecordUsed) Tool::Raise(Tool::Data, "ERR_UnknownData");
     source.CheckFits(DescriptorsAt, grids, descriptorSize);
     Resize(_grids, grids);
+    std::uint64_t allRecords = 0, allNodes = 0;
 
     for (std::uint32_t i = 0; i < grids; ++i) {
         Grid& grid = _grids[i];
@@ -230,6 +232,12 @@ void ZonCloudReadAtos::AnalyseBinary()
         grid.stepY = std::max<std::uint32_t>(1, Little<std::uint32_t>(descriptor + 20));
         grid.stepX = std::max<std::uint32_t>(1, Little<std::uint32_t>(descriptor + 24));
         source.CheckFits(grid.start, records, _recordSize);
+        // Patches hold distinct records: more than the file has room for
+        // means descriptors that claim the same records again and again.
+        allRecords += records;
+        if (allRecords > static_cast<std::uint64_t>(source.Size()) / _recordSize ||
+            allRecords > static_cast<std::uint64_t>(std::numeric_limits<int>::max()))
+            Tool::Raise(Tool::Data, "ERR_UnknownData");
 
         // The row index covers the rows seen so far; it grows as records of
         // rows outside it come, within what the records can justify.
@@ -252,10 +260,31 @@ void ZonCloudReadAtos::AnalyseBinary()
             RowSpan& span = grid.rows[static_cast<std::size_t>(index)];
             span.first = std::min(span.first, offset);
             span.last = std::max(span.last, offset);
+            ++span.records;
             Count(grid, record);
         });
         ZonCloudGridRow::CheckSize(grid.Rows(), grid.Columns(), records);
+        allNodes += grid.Rows() * grid.Columns();
+        ZonCloudGridRow::CheckSize(1, allNodes, allRecords);
+
+        std::uint64_t spanned = 0;
+        for (const RowSpan& span : grid.rows)
+            if (span.records > 0) spanned += (span.last - span.first) / _recordSize + 1;
+        if (spanned > 4 * records + 1024) IndexUnorderedRows(grid);
     }
+}
+
+void ZonCloudReadAtos::IndexUnorderedRows(Grid& grid)
+{
+    Resize(grid.rowStart, grid.rows.size() + 1);
+    for (std::size_t r = 0; r < grid.rows.size(); ++r) grid.rowStart[r + 1] = grid.rowStart[r] + grid.rows[r].records;
+    Resize(grid.order, grid.rowStart.back());
+    std::vector<std::uint64_t> next(grid.rowStart.begin(), grid.rowStart.end() - 1);
+    std::uint32_t index = 0;
+    ForEachRecord(grid.start, grid.order.size(), [&](std::uint64_t, const unsigned char* bytes) {
+        const auto r = static_cast<std::size_t>(Decode(bytes, grid).row - grid.minRow);
+        grid.order[next[r]++] = index++;
+    });
 }
 
 bool ZonCloudReadAtos::ParsePoint(const char* first, const char* last, const Grid& grid, Record& record) const
@@ -324,7 +353,18 @@ void ZonCloudReadAtos::ReadRow(std::size_t index, std::uint64_t rowIndex, ZonClo
 
 void ZonCloudReadAtos::ReadBinaryRow(const Grid& grid, std::int64_t gridRow, ZonCloudGridRow& row)
 {
-    const RowSpan& span = grid.rows[static_cast<std::size_t>(gridRow - grid.minRow)];
+    const auto r = static_cast<std::size_t>(gridRow - grid.minRow);
+    if (!grid.order.empty()) {
+        ZonCloudByteSource& source = Source();
+        unsigned char bytes[RecordUsed];
+        for (std::uint64_t i = grid.rowStart[r]; i < grid.rowStart[r + 1]; ++i) {
+            source.Seek(grid.start + std::uint64_t{grid.order[i]} * _recordSize);
+            source.Read(bytes, sizeof bytes);
+            Place(grid, Decode(bytes, grid), row);
+        }
+        return;
+    }
+    const RowSpan& span = grid.rows[r];
     if (span.first > span.last) return;  // a row without records: all holes
     const std::uint64_t count = (span.last - span.first) / _recordSize + 1;
     ForEachRecord(span.first, count, [&](std::uint64_t, const unsigned char* bytes) {

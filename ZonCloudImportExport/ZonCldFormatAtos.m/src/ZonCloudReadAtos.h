@@ -62,6 +62,7 @@ private:
     struct RowSpan {
         std::uint64_t first = UINT64_MAX;  // offset of the row's first record
         std::uint64_t last = 0;            // and of its last
+        std::uint64_t records = 0;
     };
     struct Grid {
         std::int64_t minColumn = INT64_MAX, maxColumn = INT64_MIN;
@@ -70,6 +71,11 @@ private:
         std::uint64_t start = 0;    // first record, or first data line
         std::uint64_t records = 0;  // point records (binary) or point lines (text)
         std::vector<RowSpan> rows;  // binary: by grid row from minRow
+        // Binary patches whose rows are not stored one after the other (the
+        // spans of the rows overlap): the records of each row, in file order,
+        // so that a row never reads the records of others.
+        std::vector<std::uint32_t> order;
+        std::vector<std::uint64_t> rowStart;  // into order, one per row and one past the last
         std::uint64_t Rows() const { return maxRow < minRow ? 0 : static_cast<std::uint64_t>(maxRow - minRow) + 1; }
         std::uint64_t Columns() const
         {
@@ -92,6 +98,7 @@ private:
     // reads on from `resume` and leaves there where the next row starts.
     void ReadRow(std::size_t grid, std::uint64_t index, ZonCloudGridRow& row, std::uint64_t& resume);
     void ReadBinaryRow(const Grid& grid, std::int64_t gridRow, ZonCloudGridRow& row);
+    void IndexUnorderedRows(Grid& grid);
     void ReadTextRow(const Grid& grid, std::int64_t gridRow, ZonCloudGridRow& row, std::uint64_t& resume);
     void Place(const Grid& grid, const Record& record, ZonCloudGridRow& row) const;
     // Calls visit(offset, bytes) for `count` records of _recordSize bytes

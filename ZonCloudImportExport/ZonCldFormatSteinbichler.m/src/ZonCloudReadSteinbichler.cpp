@@ -147,14 +147,19 @@ void ZonCloudReadSteinbichler::AnalyseFile()
     if (mark[0] != 'I' || mark[1] != 'I') Tool::Raise(Tool::Data, "ERR_UnknownData");
 
     const auto size = static_cast<std::uint64_t>(std::max<std::int64_t>(source.Size(), 0));
-    std::uint64_t total = 0;
+    std::uint64_t total = 0, scans = 0, slots = 0;
     std::uint64_t offset = FirstHeader;
     for (;;) {
         Subset subset;
         subset.header = offset;
         ReadHeader(subset);
+        const std::uint64_t headerEnd = _lines.NextOffset();
         CheckTables(subset);
         total += subset.points;
+        scans += subset.scans;
+        // Scan tables are distinct too.
+        if (scans > size / ScanEntrySize) Tool::Raise(Tool::Data, "ERR_UnknownData");
+        if (subset.IsGridded()) slots += subset.maxX * subset.maxY;
         // Subsets hold distinct records: more points than the file has room
         // for means subsets that claim the same bytes again and again.
         if (total > size / RecordSize || total > static_cast<std::uint64_t>(std::numeric_limits<int>::max()))
@@ -173,12 +178,15 @@ void ZonCloudReadSteinbichler::AnalyseFile()
         const std::uint64_t next = subset.next;
         Allocating([&] { _subsets.push_back(std::move(subset)); });
         if (next == 0) break;
-        // The list runs forward through the file; anything else could loop.
-        if (next <= offset || next >= size) Tool::Raise(Tool::Data, "ERR_UnknownData");
+        // The list runs forward through the file, each subset after the
+        // header before it; anything else could loop or read bytes again.
+        if (next < headerEnd || next <= offset || next >= size) Tool::Raise(Tool::Data, "ERR_UnknownData");
         offset = next;
     }
     _lines.Release();
     if (total == 0) Tool::Raise(Tool::Data, "ERR_NoPointFound");
+    // All grids together, not only each one, must be justified by the records.
+    ZonCloudGridRow::CheckSize(1, slots, total);
     _numberOfPoints = static_cast<int>(total);
     const Subset& first = _subsets.front();
     _digitizationType = first.IsScanned() ? DigitizationScans : first.IsGridded() ? DigitizationGrids : DigitizationCloud;
@@ -189,7 +197,13 @@ void ZonCloudReadSteinbichler::ReadHeader(Subset& subset)
     _lines.Start(Source(), subset.header);
     const char* first = nullptr;
     const char* last = nullptr;
-    while (!(subset.hasFirstDataByte && _lines.NextOffset() >= subset.firstDataByte) && _lines.Next(first, last)) {
+    // The header also ends where the next subset begins, so that no byte is
+    // read as a header line twice.
+    const auto ended = [&] {
+        const std::uint64_t at = _lines.NextOffset();
+        return (subset.hasFirstDataByte && at >= subset.firstDataByte) || (subset.next != 0 && at >= subset.next);
+    };
+    while (!ended() && _lines.Next(first, last)) {
         const char* value = nullptr;
         const Keyword* keyword = Match(first, last, value);
         if (!keyword) continue;
@@ -311,6 +325,7 @@ void ZonCloudReadSteinbichler::CheckTables(Subset& subset)
     if (subset.IsScanned()) {
         source.CheckFits(subset.scanTable + 4, subset.scans, ScanEntrySize);
         Resize(subset.scanEntries, subset.scans);
+        std::uint64_t scanned = 0;
         Resize(_buffer, subset.scans * ScanEntrySize);
         if (subset.scans > 0) {
             source.Seek(subset.scanTable + 4);
@@ -321,6 +336,10 @@ void ZonCloudReadSteinbichler::CheckTables(Subset& subset)
             entry.first = ZonCloudByteSource::LoadLittle<std::uint32_t>(_buffer.data() + i * ScanEntrySize);
             entry.count = ZonCloudByteSource::LoadLittle<std::uint32_t>(_buffer.data() + i * ScanEntrySize + 4);
             if (std::uint64_t{entry.first} + entry.count > subset.points) Tool::Raise(Tool::Data, "ERR_UnknownData");
+            // A scan table shares the subset's points out: together its scans
+            // hold no more points than the subset.
+            scanned += entry.count;
+            if (scanned > subset.points) Tool::Raise(Tool::Data, "ERR_UnknownData");
         }
     } else if (subset.IsGridded()) {
         ZonCloudGridRow::CheckSize(subset.maxY, subset.maxX, subset.points);
