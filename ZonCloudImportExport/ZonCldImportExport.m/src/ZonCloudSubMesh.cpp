@@ -6,20 +6,23 @@
 #include "ZonCloudReadFile.h"
 
 void ZonCloudSubMesh::Compute(const ZonMathBox& box, const ZonMathBox& fileBox, const float* vertices,
-                              std::size_t vertexCount, const std::uint32_t* triangles, std::size_t triangleCount)
+                              std::size_t vertexCount, const std::uint32_t* triangles, std::size_t triangleCount,
+                              const unsigned char* valid)
 {
-    Build(box, fileBox, vertices, vertexCount, triangles, triangleCount);
+    Build(box, fileBox, vertices, vertexCount, triangles, triangleCount, valid);
 }
 
 void ZonCloudSubMesh::Compute(const ZonMathBox& box, const ZonMathBox& fileBox, const double* vertices,
-                              std::size_t vertexCount, const std::uint32_t* triangles, std::size_t triangleCount)
+                              std::size_t vertexCount, const std::uint32_t* triangles, std::size_t triangleCount,
+                              const unsigned char* valid)
 {
-    Build(box, fileBox, vertices, vertexCount, triangles, triangleCount);
+    Build(box, fileBox, vertices, vertexCount, triangles, triangleCount, valid);
 }
 
 template <class T>
 void ZonCloudSubMesh::Build(const ZonMathBox& box, const ZonMathBox& fileBox, const T* vertices,
-                            std::size_t vertexCount, const std::uint32_t* triangles, std::size_t triangleCount)
+                            std::size_t vertexCount, const std::uint32_t* triangles, std::size_t triangleCount,
+                            const unsigned char* valid)
 {
     Clear();
     _box = box;
@@ -31,6 +34,7 @@ void ZonCloudSubMesh::Build(const ZonMathBox& box, const ZonMathBox& fileBox, co
         std::uint32_t inside = 0;
         for (std::size_t i = 0; i < vertexCount; ++i) {
             const T* v = vertices + 3 * i;
+            if (valid && !valid[i]) continue;
             if (!ZonCloudReadFile::IsInQueryBox(v[0], v[1], v[2], box, fileBox)) continue;
             renumbered[i] = inside++;
             _vertices.insert(_vertices.end(),

@@ -15,12 +15,14 @@ public:
     bool IsFor(const ZonMathBox& box) const { return _valid && box.IsSameAs(_box); }
     void Clear() { *this = ZonCloudSubMesh(); }
 
-    // `fileBox` is the mesh's own box (its upper faces are closed). An
-    // allocation failure leaves the sub-mesh empty and raises std::bad_alloc.
+    // `fileBox` is the mesh's own box (its upper faces are closed). With
+    // `valid`, one byte per vertex, a vertex whose byte is 0 (a void sample of
+    // a height grid) is never inside. An allocation failure leaves the
+    // sub-mesh empty and raises std::bad_alloc.
     void Compute(const ZonMathBox& box, const ZonMathBox& fileBox, const float* vertices, std::size_t vertexCount,
-                 const std::uint32_t* triangles, std::size_t triangleCount);
+                 const std::uint32_t* triangles, std::size_t triangleCount, const unsigned char* valid = nullptr);
     void Compute(const ZonMathBox& box, const ZonMathBox& fileBox, const double* vertices, std::size_t vertexCount,
-                 const std::uint32_t* triangles, std::size_t triangleCount);
+                 const std::uint32_t* triangles, std::size_t triangleCount, const unsigned char* valid = nullptr);
 
     const std::vector<float>& Vertices() const { return _vertices; }
     const std::vector<std::uint32_t>& Triangles() const { return _triangles; }
@@ -30,7 +32,7 @@ public:
 private:
     template <class T>
     void Build(const ZonMathBox& box, const ZonMathBox& fileBox, const T* vertices, std::size_t vertexCount,
-               const std::uint32_t* triangles, std::size_t triangleCount);
+               const std::uint32_t* triangles, std::size_t triangleCount, const unsigned char* valid);
 
     ZonMathBox _box;
     bool _valid = false;
