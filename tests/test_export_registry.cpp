@@ -34,6 +34,7 @@ TEST(ExportRegistry, TheTargetsExtensionChoosesTheExporter)
         {"out.stl", "CloudExporterStl"},          {"out.asc_fmt", "CloudExporterAsciiUserFormat"},
         {"out.asc_rgb", "CloudExporterLeica"},    {"out.xyz_rgb", "CloudExporterLeica"},
         {"out.cgo", "CloudExporterCgoAscii"},     {"two.dots.cgo", "CloudExporterCgoAscii"},
+        {"out.3mf", "CloudExporter3MF"},          {"OUT.3MF", "CloudExporter3MF"},
     };
     for (const auto& c : cases) EXPECT_EQ(RegistryOf(c.file), c.registry) << c.file;
     for (const char* file : {"out.xyz_unknown", "out", "dir.asc/out", "out.asc.", "out.cgo_ascii", ".asc_rgbx"})
@@ -48,7 +49,7 @@ TEST(ExportRegistry, EachExtensionHasOneExporterAndEachExporterSaysWhatItHolds)
     const std::map<std::string, unsigned> accepts = {
         {"CloudExporterAsciiLibre", K::EveryKind}, {"CloudExporterAsciiUserFormat", K::EveryKind},
         {"CloudExporterCgoAscii", K::EveryKind},   {"CloudExporterLeica", K::EveryKind},
-        {"CloudExporterStl", K::Meshes},
+        {"CloudExporterStl", K::Meshes},           {"CloudExporter3MF", K::Meshes},
     };
     std::map<std::string, unsigned> found;
     std::set<std::string> extensions;

@@ -181,7 +181,14 @@ void RunPointDocument(const char* type, const std::string& path, unsigned n)
     Require(output->Close(), "close");
 }
 
-// The exporter reports its errors instead of raising them.
+// The exporters report their errors instead of raising them.
+void Run3MFExporter(const std::string& path, unsigned n)
+{
+    auto exporter = ZonQueryInterface<ZonIExchExporter>(ZonObjectRegistry::CreateByLateType("3MFExporter"));
+    if (!exporter) throw std::runtime_error("no exporter");
+    exporter->Export(Document(ZonExchNodeSolid, n), path, {});
+}
+
 void RunStlExporter(const std::string& path, unsigned n, const char* binary)
 {
     auto exporter = ZonQueryInterface<ZonIExchExporter>(ZonObjectRegistry::CreateByLateType("STLExporter"));
@@ -228,6 +235,9 @@ const std::vector<Case>& Cases()
          [](const std::string& path, unsigned n) { RunStlExporter(path, n, "1"); }},
         {"StlExporterText", "out.stl", 200,
          [](const std::string& path, unsigned n) { RunStlExporter(path, n, "0"); }},
+        // The package's tree is what meets the limit: the archive is smaller.
+        {"ThreeMFExporter", "out.3mf", 200,
+         [](const std::string& path, unsigned n) { Run3MFExporter(path, n); }},
         {"UserFormat", "out.asc_fmt", 150,
          [](const std::string& path, unsigned n) {
              ZonCloudWriteAsciiUserFormat writer(path);
@@ -291,6 +301,7 @@ TEST_P(WriteFailure, RaisesTheSystemErrorLeavesNoFileAndReportsNoSuccess)
     EXPECT_TRUE(errorCameOut) << "raised '" << outcome.raised << "'";
     EXPECT_EQ(std::find(outcome.reported.begin(), outcome.reported.end(), Success), outcome.reported.end());
     EXPECT_FALSE(fs::exists(path));
+    EXPECT_TRUE(fs::is_empty(fs::path(path).parent_path())) << "something was left beside " << path;
 }
 
 INSTANTIATE_TEST_SUITE_P(
@@ -348,6 +359,7 @@ TEST_F(ConvertUnderLimit, ExitsOneWithTheSystemErrorAndNeverSaysTheFileWasWritte
     const std::vector<std::vector<std::string>> conversions = {
         {cloud, Path("out.asc")},  {cloud, Path("out.cgo")},       {cloud, Path("out.asc_rgb")},
         {cloud, Path("out.asc_fmt")}, {mesh, Path("out.stl"), "--text"}, {mesh, Path("binary.stl")},
+        {mesh, Path("out.3mf")},
     };
     for (const auto& arguments : conversions) {
         const std::string& target = arguments[1];
@@ -357,6 +369,7 @@ TEST_F(ConvertUnderLimit, ExitsOneWithTheSystemErrorAndNeverSaysTheFileWasWritte
         EXPECT_NE(output.find(tooLargeText), std::string::npos) << target << "\n" << output;
         EXPECT_EQ(output.find(target + " was written"), std::string::npos) << output;
         EXPECT_FALSE(fs::exists(target)) << target;
+        EXPECT_FALSE(fs::exists(Path("out_Zip_my_contained")));
     }
 }
 
