@@ -17,10 +17,12 @@ public:
     Row& AddRow(const unsigned char* valid, std::size_t count);
     const std::vector<Row>& GetRows() const { return _rows; }
     std::size_t GetNumberOfRows() const { return _rows.size(); }
-    // Points with their validity set.
-    std::size_t GetNumberOfValidPoints() const;
+    // Points with their validity set (counted as rows are added: the
+    // validity of a row does not change afterwards).
+    std::size_t GetNumberOfValidPoints() const { return _validPoints; }
 
 private:
     std::vector<Row> _rows;
+    std::size_t _validPoints = 0;
 };
 using ZonCldGrid_var = std::shared_ptr<ZonCldGrid>;

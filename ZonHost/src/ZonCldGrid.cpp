@@ -8,16 +8,16 @@ ZonCldGrid::Row& ZonCldGrid::AddRow(const unsigned char* valid, std::size_t coun
     if (valid) {
         row.valid.resize(count);
         // Any non-zero byte is a valid point; keep the bytes as 0 and 1.
-        std::transform(valid, valid + count, row.valid.begin(), [](unsigned char v) -> unsigned char { return v ? 1 : 0; });
+        std::size_t validCount = 0;
+        for (std::size_t i = 0; i < count; ++i) {
+            const unsigned char v = valid[i] ? 1 : 0;
+            row.valid[i] = v;
+            validCount += v;
+        }
+        _validPoints += validCount;
     } else {
         row.valid.assign(count, 1);
+        _validPoints += count;
     }
     return row;
-}
-
-std::size_t ZonCldGrid::GetNumberOfValidPoints() const
-{
-    std::size_t n = 0;
-    for (const Row& row : _rows) n += static_cast<std::size_t>(std::count(row.valid.begin(), row.valid.end(), 1));
-    return n;
 }

@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <cmath>
 #include <cstring>
+#include <limits>
 #include <type_traits>
 
 namespace {
@@ -28,28 +29,26 @@ void SelectTriples(std::vector<T>& values, const std::vector<std::size_t>& indic
         for (std::size_t k = 0; k < 3; ++k) kept[3 * i + k] = values[3 * indices[i] + k];
     values = std::move(kept);
 }
-// Accumulates in plain doubles: AddPoint per point is the slow path for millions of points.
+// Accumulates in the array's own type with plain comparisons (the minimum
+// and maximum of floats are the same taken in float or in double): AddPoint
+// per point is the slow path for millions of points.
 template <class T>
 void AddTriplesToBox(const std::vector<T>& xyz, const unsigned char* flags, ZonMathBox& box)
 {
-    double low[3] = {0, 0, 0}, high[3] = {0, 0, 0};
-    bool any = false;
-    for (std::size_t i = 0; i < xyz.size() / 3; ++i) {
+    constexpr T Infinity = std::numeric_limits<T>::infinity();
+    T low[3] = {Infinity, Infinity, Infinity}, high[3] = {-Infinity, -Infinity, -Infinity};
+    const std::size_t n = xyz.size() / 3;
+    const T* p = xyz.data();
+    for (std::size_t i = 0; i < n; ++i, p += 3) {
         if (flags && !flags[i]) continue;
-        const T* p = &xyz[3 * i];
         // A point with a missing coordinate has no place in a box.
         if (!std::isfinite(p[0]) || !std::isfinite(p[1]) || !std::isfinite(p[2])) continue;
-        if (!any) {
-            for (int a = 0; a < 3; ++a) low[a] = high[a] = p[a];
-            any = true;
-            continue;
-        }
         for (int a = 0; a < 3; ++a) {
-            low[a] = std::min(low[a], static_cast<double>(p[a]));
-            high[a] = std::max(high[a], static_cast<double>(p[a]));
+            low[a] = p[a] < low[a] ? p[a] : low[a];
+            high[a] = p[a] > high[a] ? p[a] : high[a];
         }
     }
-    if (!any) return;
+    if (low[0] > high[0]) return;  // no point
     box.AddPoint(low[0], low[1], low[2]);
     box.AddPoint(high[0], high[1], high[2]);
 }

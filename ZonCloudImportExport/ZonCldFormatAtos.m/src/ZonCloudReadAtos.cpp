@@ -114,6 +114,10 @@ void ZonCloudReadAtos::ResetAnalysis()
     _boundingBox = ZonMathBox();
     _leastQuality = _greatestQuality = 0.0;
     _qualitySeen = false;
+    for (int a = 0; a < 3; ++a) {
+        _low[a] = std::numeric_limits<float>::infinity();
+        _high[a] = -std::numeric_limits<float>::infinity();
+    }
     _cloud.clear();
     _cloudRead = false;
     _cursor.Reset();
@@ -142,6 +146,8 @@ void ZonCloudReadAtos::AnalyseFile()
         }
         _lines.Release();
     }
+    if (_low[0] <= _high[0] && _low[1] <= _high[1] && _low[2] <= _high[2])
+        _boundingBox = ZonMathBox(_low[0], _high[0], _low[1], _high[1], _low[2], _high[2]);
     _digitizationType = DigitizationGrids;
 }
 
@@ -162,7 +168,11 @@ void ZonCloudReadAtos::Count(Grid& grid, const Record& record)
     if (!IsValid(record.quality)) return;
     ++_numberOfPoints;
     // The box of the points as they are delivered, in single precision.
-    _boundingBox.AddPoint(static_cast<float>(record.x), static_cast<float>(record.y), static_cast<float>(record.z));
+    const float p[3] = {static_cast<float>(record.x), static_cast<float>(record.y), static_cast<float>(record.z)};
+    for (int a = 0; a < 3; ++a) {
+        _low[a] = p[a] < _low[a] ? p[a] : _low[a];
+        _high[a] = p[a] > _high[a] ? p[a] : _high[a];
+    }
 }
 
 template <class Visit>

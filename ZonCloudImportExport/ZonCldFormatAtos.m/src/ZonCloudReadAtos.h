@@ -115,6 +115,7 @@ private:
     float _minQuality = 0.0f;
     double _leastQuality = 0.0, _greatestQuality = 0.0;
     bool _qualitySeen = false;
+    float _low[3] = {}, _high[3] = {};  // box of the valid points while counting
     char _nativePoint;
     char _decimalPoint = '.';
     bool _decimalPointSwitched = false;
