@@ -394,3 +394,89 @@ TEST_F(DicomFiles, ImportKeepsTextsAsValuesAndTheToolShowsSlicesGreysAndTexts)
 }
 
 }  // namespace
+
+namespace {
+
+bool HasOracles() { return std::getenv("ZON_WITH_ORACLES") && std::string(std::getenv("ZON_WITH_ORACLES")) == "1"; }
+
+bool Runs(const std::string& command) { return std::system((command + " >/dev/null 2>&1").c_str()) == 0; }
+
+// pydicom writes a signed CT slice with an oblique orientation, non-square
+// spacing and a window, in either VR form, and writes where each pixel lies
+// by the tags it reads back, with the stored values.
+const char* PydicomSlice = R"(
+import sys, json, numpy as np, pydicom
+from pydicom.dataset import Dataset, FileMetaDataset
+from pydicom.uid import ExplicitVRLittleEndian, ImplicitVRLittleEndian, generate_uid
+path, implicit = sys.argv[1], sys.argv[2] == "implicit"
+meta = FileMetaDataset()
+meta.MediaStorageSOPClassUID = "1.2.840.10008.5.1.4.1.1.2"
+meta.MediaStorageSOPInstanceUID = generate_uid()
+meta.TransferSyntaxUID = ImplicitVRLittleEndian if implicit else ExplicitVRLittleEndian
+ds = Dataset()
+ds.file_meta = meta
+ds.is_little_endian, ds.is_implicit_VR = True, implicit
+ds.SOPClassUID, ds.SOPInstanceUID = meta.MediaStorageSOPClassUID, meta.MediaStorageSOPInstanceUID
+ds.ReferencedImageSequence = [Dataset()]
+ds.ReferencedImageSequence[0].ReferencedSOPInstanceUID = "1.2.3.4"
+ds.InstanceNumber = 7
+ds.ImagePositionPatient = [-12.5, 40.25, 3.0]
+ds.ImageOrientationPatient = [0.8, 0.6, 0.0, 0.0, 0.0, -1.0]
+ds.PixelSpacing = [0.75, 1.5]
+ds.SamplesPerPixel, ds.PhotometricInterpretation = 1, "MONOCHROME2"
+ds.Rows, ds.Columns = 3, 4
+ds.BitsAllocated, ds.BitsStored, ds.HighBit, ds.PixelRepresentation = 16, 16, 15, 1
+ds.WindowCenter, ds.WindowWidth, ds.RescaleIntercept, ds.RescaleSlope = 40, 400, -1024, 1
+pixels = (np.arange(12, dtype=np.int16).reshape(3, 4) * 150 - 200)
+ds.PixelData = pixels.tobytes()
+ds.save_as(path, write_like_original=False)
+back = pydicom.dcmread(path)
+P = np.array(back.ImagePositionPatient, dtype=float)
+o = np.array(back.ImageOrientationPatient, dtype=float)
+dr, dc = float(back.PixelSpacing[0]), float(back.PixelSpacing[1])
+points = []
+for r in range(back.Rows):
+    for c in range(back.Columns):
+        points += list(P + c * dc * o[:3] + r * dr * o[3:])
+open(sys.argv[3], "w").write(json.dumps({"points": points, "values": back.pixel_array.flatten().tolist()}))
+)";
+
+class DicomOracles : public zontest::FilesTest {};
+
+TEST_F(DicomOracles, SlicesOfPydicomAndDcmtkReadAsTheyPlaceThem)
+{
+    if (!HasOracles()) GTEST_SKIP() << "ZON_WITH_ORACLES is not 1";
+    if (!Runs("/usr/bin/python3 -c 'import pydicom, numpy'")) GTEST_SKIP() << "pydicom is not installed";
+    if (!Runs("dcmconv --version")) GTEST_SKIP() << "DCMTK is not installed";
+    Write("slice.py", PydicomSlice);
+    for (const char* form : {"explicit", "implicit"}) {
+        SCOPED_TRACE(form);
+        const std::string dcm = Path(std::string(form) + ".dcm"), json = Path("expected.json");
+        ASSERT_TRUE(Runs("/usr/bin/python3 " + zontest::Quote(Path("slice.py")) + " " + zontest::Quote(dcm) + " " +
+                         form + " " + zontest::Quote(json)));
+        const nlohmann::json expected = nlohmann::json::parse(zontest::Slurp(json));
+        // DCMTK rewrites the same slice in the other VR form; both must read alike.
+        const std::string converted = Path(std::string(form) + "-dcmtk.dcm");
+        ASSERT_TRUE(Runs(std::string("dcmconv ") + (form[0] == 'e' ? "+ti " : "+te ") + zontest::Quote(dcm) + " " +
+                         zontest::Quote(converted)));
+        for (const std::string& file : {dcm, converted}) {
+            const std::string bytes = zontest::Slurp(file);
+            const Read r = ReadBytes(bytes);
+            ASSERT_EQ(r.points.size(), expected["points"].size());
+            for (std::size_t i = 0; i < r.points.size(); ++i)
+                EXPECT_NEAR(r.points[i], expected["points"][i].get<double>(), 1e-4) << i;
+            for (std::size_t i = 0; i < r.texts.size(); ++i)
+                EXPECT_EQ(r.texts[i], "Density = " + std::to_string(expected["values"][i].get<int>()));
+            // Densities -1224 ... 426 through the window 40/400: the clamped ends give 0 and 255.
+            EXPECT_EQ(r.greys.front(), 0);
+            EXPECT_EQ(r.greys.back(), 255);
+        }
+    }
+    // Big endian, as DCMTK writes it, is refused by name.
+    const std::string big = Path("big.dcm");
+    ASSERT_TRUE(Runs("dcmconv +tb " + zontest::Quote(Path("explicit.dcm")) + " " + zontest::Quote(big)));
+    const std::string bytes = zontest::Slurp(big);
+    EXPECT_EQ(ErrorKey([&] { ReadBytes(bytes); }), "ZonCloudReadNLSTool.ERR_DicomTransferSyntax");
+}
+
+}  // namespace
