@@ -129,7 +129,7 @@ void ZonCloudReadDicom::BuildCloud()
     Reserve(_colors, 3 * kept);
     Reserve(_densities, kept);
 
-    float low[3] = {0, 0, 0}, high[3] = {0, 0, 0};
+    float low[3] = {INFINITY, INFINITY, INFINITY}, high[3] = {-INFINITY, -INFINITY, -INFINITY};
     std::array<unsigned char, 65536> greys{};
     for (ZonCloudDicomSlice& slice : _slices) {
         if (slice.pixels.empty()) continue;
@@ -144,8 +144,8 @@ void ZonCloudReadDicom::BuildCloud()
                                                : static_cast<std::int32_t>(bits);
             greys[bits] = Grey(slice, raw, least, greatest);
         }
-        const double* along = slice.orientation;      // column index grows this way
-        const double* down = slice.orientation + 3;   // row index grows this way
+        const double* along = slice.orientation;     // column index grows this way
+        const double* down = slice.orientation + 3;  // row index grows this way
         const double columnStep[3] = {along[0] * slice.spacing[1], along[1] * slice.spacing[1],
                                       along[2] * slice.spacing[1]};
         std::size_t i = 0;
@@ -155,19 +155,16 @@ void ZonCloudReadDicom::BuildCloud()
                                         slice.position[2] + row * slice.spacing[0] * down[2]};
             for (std::uint32_t column = 0; column < slice.columns; ++column, ++i) {
                 if (!sampler.Keep()) continue;
-                float p[3];
-                for (int k = 0; k < 3; ++k) p[k] = static_cast<float>(rowStart[k] + column * columnStep[k]);
-                if (_densities.empty()) {
-                    std::copy(p, p + 3, low);
-                    std::copy(p, p + 3, high);
-                }
                 for (int k = 0; k < 3; ++k) {
-                    low[k] = std::min(low[k], p[k]);
-                    high[k] = std::max(high[k], p[k]);
+                    const auto v = static_cast<float>(rowStart[k] + column * columnStep[k]);
+                    low[k] = std::min(low[k], v);
+                    high[k] = std::max(high[k], v);
+                    _points.push_back(v);
                 }
-                _points.insert(_points.end(), p, p + 3);
                 const unsigned char grey = greys[slice.pixels[i]];
-                _colors.insert(_colors.end(), {grey, grey, grey});
+                _colors.push_back(grey);
+                _colors.push_back(grey);
+                _colors.push_back(grey);
                 _densities.push_back(slice.Raw(i));
             }
         }
