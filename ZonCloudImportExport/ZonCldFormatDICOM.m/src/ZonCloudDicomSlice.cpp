@@ -90,7 +90,9 @@ double ZonCloudDicomSlice::PositionAlongNormal() const
     const double* a = orientation;
     const double* b = orientation + 3;
     const double normal[3] = {a[1] * b[2] - a[2] * b[1], a[2] * b[0] - a[0] * b[2], a[0] * b[1] - a[1] * b[0]};
-    return position[0] * normal[0] + position[1] * normal[1] + position[2] * normal[2];
+    const double along = position[0] * normal[0] + position[1] * normal[1] + position[2] * normal[2];
+    // Overflowing tags could give NaN, which no sort may see.
+    return std::isnan(along) ? 0.0 : along;
 }
 
 bool ZonCloudDicomSlice::Read(ZonCloudByteSource& source)

@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <array>
+#include <cfloat>
 #include <climits>
 #include <cmath>
 
@@ -20,6 +21,15 @@ std::int64_t Truncate(double value)
 {
     if (!(value > -9.0e18 && value < 9.0e18)) return 0;
     return static_cast<std::int64_t>(value);
+}
+
+// A coordinate as a float; beyond the float range it becomes infinite, as a
+// conversion may not be left to do.
+float ToFloat(double value)
+{
+    if (std::fabs(value) > static_cast<double>(FLT_MAX) && std::isfinite(value))
+        return value > 0 ? INFINITY : -INFINITY;
+    return static_cast<float>(value);
 }
 
 bool NameIsArchive(const ZonUnicodeString& name)
@@ -139,10 +149,16 @@ void ZonCloudReadDicom::BuildCloud()
             least = std::min(least, slice.Raw(i));
             greatest = std::max(greatest, slice.Raw(i));
         }
-        for (std::size_t bits = 0; bits < greys.size(); ++bits) {
-            const auto raw = slice.pixelSigned ? static_cast<std::int32_t>(static_cast<std::int16_t>(bits))
-                                               : static_cast<std::int32_t>(bits);
-            greys[bits] = Grey(slice, raw, least, greatest);
+        if (slice.pixels.size() >= greys.size()) {
+            for (std::size_t bits = 0; bits < greys.size(); ++bits) {
+                const auto raw = slice.pixelSigned ? static_cast<std::int32_t>(static_cast<std::int16_t>(bits))
+                                                   : static_cast<std::int32_t>(bits);
+                greys[bits] = Grey(slice, raw, least, greatest);
+            }
+        } else {
+            // A small slice: only its own values need a grey.
+            for (std::size_t j = 0; j < slice.pixels.size(); ++j)
+                greys[slice.pixels[j]] = Grey(slice, slice.Raw(j), least, greatest);
         }
         const double* along = slice.orientation;     // column index grows this way
         const double* down = slice.orientation + 3;  // row index grows this way
@@ -156,7 +172,7 @@ void ZonCloudReadDicom::BuildCloud()
             for (std::uint32_t column = 0; column < slice.columns; ++column, ++i) {
                 if (!sampler.Keep()) continue;
                 for (int k = 0; k < 3; ++k) {
-                    const auto v = static_cast<float>(rowStart[k] + column * columnStep[k]);
+                    const float v = ToFloat(rowStart[k] + column * columnStep[k]);
                     low[k] = std::min(low[k], v);
                     high[k] = std::max(high[k], v);
                     _points.push_back(v);
