@@ -336,6 +336,25 @@ TEST(DicomArchive, SlicesStackedByInstanceThenAlongTheNormal)
     EXPECT_EQ(ErrorKey([&] { ReadBytes(ZSlice(1, 0, 1), "x.dcz"); }), "ZonZipReader.ERR_Open");
 }
 
+TEST(DicomSampling, KeptPointsKeepTheirGreysAndTexts)
+{
+    const std::string bytes = Windowed({0, 10, 20, 30, 40, 50, 60, 70, 80, 90}, "", "").Bytes();
+    ZonCloudReadDicom reader("s.dcm");
+    reader.SetSourceMemory(bytes.data(), bytes.size());
+    reader.SetSamplingPercent(30.0f);
+    unsigned n = 0, colors = 0, texts = 0;
+    const float* p = reader.GetPoints(n);
+    const unsigned char* c = reader.GetPointColors(colors);
+    const auto* t = static_cast<const std::string*>(reader.GetPointAttributes3(texts));
+    ASSERT_EQ(n, 3u);  // indices 0, 4 and 7, where the whole part of 0.3 k changes
+    ASSERT_TRUE(colors == n && texts == n);
+    for (unsigned i = 0; i < n; ++i) {
+        const int raw = static_cast<int>(p[3 * i]) * 10;  // one column per pixel, spacing 1
+        EXPECT_EQ(t[i], "Density = " + std::to_string(raw));
+        EXPECT_EQ(c[3 * i], raw * 255 / 90);
+    }
+}
+
 TEST(ZipReader, MembersLargerThanTheArchiveJustifiesAreRefused)
 {
     std::string big;
