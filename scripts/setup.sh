@@ -5,6 +5,8 @@ packages=(build-essential cmake pkg-config googletest libgtest-dev libgmock-dev 
           libcli11-dev nlohmann-json3-dev libzip-dev zip unzip clang lld libclang-rt-14-dev python3)
 if [ "${ZON_WITH_ORACLES:-0}" = 1 ]; then
   packages+=(assimp-utils admesh gdal-bin lib3mf-dev)
+  # DICOM slices written by independent tools.
+  packages+=(dcmtk python3-pydicom)
 fi
 missing=()
 for p in "${packages[@]}"; do

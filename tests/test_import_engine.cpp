@@ -56,7 +56,7 @@ Floats FloatsOf(const ZonCldPointArray& points)
 std::vector<std::string> TextsOf(const ZonCldCloud& cloud)
 {
     std::vector<std::string> texts;
-    for (const auto& text : cloud.Texts()) texts.push_back(text.ToUtf8());
+    for (std::size_t i = 0; i < cloud.GetNumberOfTexts(); ++i) texts.push_back(cloud.GetText(i).ToUtf8());
     return texts;
 }
 

@@ -1,4 +1,7 @@
 #pragma once
+#include <string>
+#include <vector>
+
 #include "ZonCldExport.h"
 #include "ZonError.h"
 #include "ZonUnicodeString.h"
@@ -20,6 +23,9 @@ public:
     static void Throw(int type, const char* code);
     // The same for callers that know the type is valid: never returns.
     [[noreturn]] static void Raise(ErrorType type, const char* code);
+    // The same with the texts that fill the message's {1}, {2}, ... (what the
+    // file holds that cannot be read, named to the user).
+    [[noreturn]] static void Raise(ErrorType type, const char* code, std::vector<std::string> parameters);
 
     // Hands a caught error to the session's reporter (nothing without a session or reporter).
     static void FullReporterErrorList(ZonError* error);

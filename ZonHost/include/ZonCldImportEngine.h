@@ -32,7 +32,11 @@ using ZonCldStatLabeler = std::function<std::string(const std::string& key)>;
 // - Colours and the per-point arrays of a cloud are kept when they have one
 //   entry per point: colours R, G, B bytes; attributes 1 and 2 one 32-bit
 //   integer per point (alpha, symbol index); attribute 3 one std::string per
-//   point (text).
+//   point (text). A reader that answers ZonICloudReadPointTextValues gives
+//   its texts as a label and one integer per point instead, and the cloud
+//   keeps them in that form.
+// - Counts a reader gives through ZonICloudReadFileCounts (slices, ...) are
+//   added to the statistics under their own labels.
 //
 // `statistics` receives one line per count of what was created, labelled
 // by `labeler` (by the bare key when it is empty); the note on triangles left

@@ -8,6 +8,8 @@
 
 // The engine talks to readers through the module's public interfaces only.
 #include "ZonICloudReadFile.h"
+#include "ZonICloudReadFileCounts.h"
+#include "ZonICloudReadPointTextValues.h"
 #include "ZonICloudReadGridFile.h"
 #include "ZonICloudReadPolygonFile.h"
 #include "ZonICloudReadScanFile.h"
@@ -138,12 +140,18 @@ private:
     template <class T>
     void KeepPerPointArrays(ZonCldCloud& cloud, const std::vector<T>& kept, unsigned keptCount)
     {
-        unsigned colorCount = 0, alphaCount = 0, symbolCount = 0, textCount = 0;
+        unsigned colorCount = 0, alphaCount = 0, symbolCount = 0, textCount = 0, textValueCount = 0;
         const unsigned char* colors = _reader.GetPointColors(colorCount);
         const auto* alphas = static_cast<const std::int32_t*>(_reader.GetPointAttributes1(alphaCount));
         const auto* symbols = static_cast<const std::int32_t*>(_reader.GetPointAttributes2(symbolCount));
-        const auto* texts = static_cast<const std::string*>(_reader.GetPointAttributes3(textCount));
-        if (!colors && !alphas && !symbols && !texts) return;
+        // Texts given as label and values stay in that form; only other readers are asked for strings.
+        ZonUnicodeString textLabel;
+        const std::int32_t* textValues = nullptr;
+        if (auto valued = ZonQueryInterface<ZonICloudReadPointTextValues>(_handle))
+            textValues = valued->GetPointTextValues(textValueCount, textLabel);
+        const auto* texts =
+            textValues ? nullptr : static_cast<const std::string*>(_reader.GetPointAttributes3(textCount));
+        if (!colors && !alphas && !symbols && !texts && !textValues) return;
 
         unsigned total = keptCount;
         std::vector<std::size_t> indices;
@@ -158,6 +166,8 @@ private:
         if (colors && colorCount == total) cloud.Colors() = SelectPerPoint(colors, 3, selection, total);
         if (alphas && alphaCount == total) cloud.Alphas() = SelectPerPoint(alphas, 1, selection, total);
         if (symbols && symbolCount == total) cloud.Symbols() = SelectPerPoint(symbols, 1, selection, total);
+        if (textValues && textValueCount == total)
+            cloud.SetTextValues(textLabel.ToUtf8(), SelectPerPoint(textValues, 1, selection, total));
         if (texts && textCount == total) {
             for (std::string& text : SelectPerPoint(texts, 1, selection, total)) cloud.Texts().emplace_back(std::move(text));
         }
@@ -292,6 +302,8 @@ private:
     bool _double = false;
 };
 
+using FileCounts = std::vector<std::pair<std::string, std::uint64_t>>;
+
 void AddLine(std::string& text, const ZonCldStatLabeler& labeler, const char* key, const std::string& value)
 {
     text += "  ";
@@ -301,10 +313,11 @@ void AddLine(std::string& text, const ZonCldStatLabeler& labeler, const char* ke
     text += '\n';
 }
 
-std::string Statistics(const ZonCldBody& body, const ZonCldStatLabeler& labeler)
+std::string Statistics(const ZonCldBody& body, const ZonCldStatLabeler& labeler, const FileCounts& fileCounts)
 {
     std::string text;
     AddLine(text, labeler, "Points", std::to_string(body.GetNumberOfPoints()));
+    for (const auto& [key, count] : fileCounts) AddLine(text, labeler, key.c_str(), std::to_string(count));
     if (!body.GetSetsOfScans().empty()) {
         AddLine(text, labeler, "SetsOfScans", std::to_string(body.GetSetsOfScans().size()));
         AddLine(text, labeler, "Scans", std::to_string(body.GetNumberOfScans()));
@@ -348,7 +361,9 @@ void ZonCldImportEngine::InsertFile(ZonCldBody& body, ZonGeoFactoryProtected& fa
         body.SetUnitName(fileUnit ? fileUnit->Name() : "mm");
 
         Walker(body, factory, *reader, reader, box, factor, createTriangles, messages, labeler).Walk(type, useDouble);
-        statistics = Statistics(body, labeler);
+        FileCounts fileCounts;
+        if (auto counts = ZonQueryInterface<ZonICloudReadFileCounts>(reader)) fileCounts = counts->GetFileCounts();
+        statistics = Statistics(body, labeler, fileCounts);
     } catch (const std::bad_alloc&) {
         ZonCloudOperErrorTool::ThrowInsufficientMemory();
     } catch (const std::length_error&) {

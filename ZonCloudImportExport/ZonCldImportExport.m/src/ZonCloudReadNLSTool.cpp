@@ -28,9 +28,12 @@ void ZonCloudReadNLSTool::Throw(int type, const char* code)
     Raise(static_cast<ErrorType>(type), code);
 }
 
-void ZonCloudReadNLSTool::Raise(ErrorType type, const char* code)
+void ZonCloudReadNLSTool::Raise(ErrorType type, const char* code) { Raise(type, code, {}); }
+
+void ZonCloudReadNLSTool::Raise(ErrorType type, const char* code, std::vector<std::string> parameters)
 {
     ZonCloudOperError error = Build(code);
+    error.SetParameters(std::move(parameters));
     error.SetSeverity(static_cast<int>(type) + 1);
     // Each type is raised from its own line so a report tells them apart.
     switch (type) {
