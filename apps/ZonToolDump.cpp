@@ -7,6 +7,7 @@
 #include "ZonCloudTool.h"
 #include "ZonICloudReadGridFile.h"
 #include "ZonICloudReadPolygonFile.h"
+#include "ZonICloudReadPolygonParts.h"
 #include "ZonICloudReadScanFile.h"
 
 namespace {
@@ -171,9 +172,27 @@ private:
             if (triangles)
                 for (std::size_t t = 0; t < triangleCount; ++t)
                     triangleList.push_back({triangles[3 * t], triangles[3 * t + 1], triangles[3 * t + 2]});
-            list.push_back({{"vertices", PointsJson(vertices, vertexCount)}, {"triangles", std::move(triangleList)}});
+            nlohmann::json polygon = {{"vertices", PointsJson(vertices, vertexCount)},
+                                      {"triangles", std::move(triangleList)}};
+            if (!_clip) AddPolygonParts(polygon);
+            list.push_back(std::move(polygon));
         }
         return list;
+    }
+
+    // Named parts ("surfaces": name and end, one past the last triangle) and
+    // vertex labels of readers that have them. Both index the whole polygon:
+    // a box query has no counterpart for them.
+    void AddPolygonParts(nlohmann::json& polygon)
+    {
+        const auto parts = ZonQueryInterface<ZonICloudReadPolygonParts>(_reader);
+        if (!parts) return;
+        nlohmann::json surfaces = nlohmann::json::array();
+        for (const ZonCloudPolygonPart& part : parts->GetPolygonParts())
+            surfaces.push_back({{"name", part.name}, {"end", part.end}});
+        polygon["surfaces"] = std::move(surfaces);
+        if (const std::vector<std::string>& labels = parts->GetVertexLabels(); !labels.empty())
+            polygon["labels"] = labels;
     }
 
     ZonICloudReadFile_var _reader;
