@@ -1,0 +1,10 @@
+GOCAD TSurf 1
+name: s
+PVRTX 1 0 0 0 7
+VRTX 2 1 0 0
+VRTX 99 1 1 1
+ATOM 3 1
+TRGL 1 2 3
+TRGL 1 2 99
+# END
+END
