@@ -144,7 +144,7 @@ public:
         // The word after "name:", as "%s" reads it.
         while (first < last && IsSpace(*first)) ++first;
         const char* end = first;
-        while (end < last && !IsSpace(*end)) ++end;
+        while (end < last && *end != '\0' && !IsSpace(*end)) ++end;
         _name.assign(first, end);
     }
     void Vertex(const char* first, const char* last, bool controlNode)
@@ -192,37 +192,41 @@ private:
     std::string _name;
 };
 
-// The keyword rules both passes share. A line is cut at a NUL, as a C string
-// would end there.
+// The keyword rules both passes share.
 template <class Pass>
 void ZonCloudReadGoCad::Walk(ZonCloudLineSource& lines, Pass& pass)
 {
     bool inSurface = false;
     const char* first = nullptr;
     const char* last = nullptr;
+    // A keyword after a NUL is not on the line, as a C string would end there.
+    const auto find = [&]<std::size_t N>(const char(&word)[N]) -> const char* {
+        const char* hit = Find(first, last, word);
+        return hit && !std::memchr(first, '\0', static_cast<std::size_t>(hit - first)) ? hit : nullptr;
+    };
     while (lines.Next(first, last)) {
-        if (const void* nul = std::memchr(first, '\0', static_cast<std::size_t>(last - first)))
-            last = static_cast<const char*>(nul);
         // Comments, and lines such as END_ORIGINAL_COORDINATE_SYSTEM that must not end a surface.
-        if (first == last || *first == '#' || Find(first, last, "END_")) continue;
-        if (const char* name = Find(first, last, "name:")) pass.Name(name + 5, last);
+        if (first == last || *first == '#') continue;
+        const char* end = find("END");
+        if (end && Find(end, last, "END_") && find("END_")) continue;
+        if (const char* name = find("name:")) pass.Name(name + 5, last);
         if (!inSurface) {
             // Any other object type is outside a surface, so skipped.
-            if (Find(first, last, "GOCAD") && Find(first, last, "TSurf")) {
+            if (find("GOCAD") && find("TSurf")) {
                 pass.Open();
                 inSurface = true;
             }
             continue;
         }
         // After the name: a name holding "END" ends its surface too.
-        if (Find(first, last, "END")) {
+        if (end) {
             pass.Close();
             inSurface = false;
-        } else if (const char* vertex = Find(first, last, "VRTX")) {
-            pass.Vertex(vertex + 4, last, Find(first, last, "CNXYZ") != nullptr);
-        } else if (const char* atom = Find(first, last, "ATOM")) {
+        } else if (const char* vertex = find("VRTX")) {
+            pass.Vertex(vertex + 4, last, find("CNXYZ") != nullptr);
+        } else if (const char* atom = find("ATOM")) {
             pass.Atom(atom + 4, last);
-        } else if (const char* triangle = Find(first, last, "TRGL")) {
+        } else if (const char* triangle = find("TRGL")) {
             pass.Triangle(triangle + 4, last);
         }
     }
