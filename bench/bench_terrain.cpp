@@ -23,36 +23,10 @@
 #include "ZonCldReadArcInfoGrid.h"
 #include "ZonCldReadSRTM.h"
 
-// Heap in use and its peak, counted by the global allocation functions.
-namespace {
-std::atomic<std::size_t> gHeapInUse{0};
-std::atomic<std::size_t> gHeapPeak{0};
+#include "ZonBenchHeap.h"
 
-void* CountedAlloc(std::size_t size)
-{
-    void* p = std::malloc(size ? size : 1);
-    if (!p) throw std::bad_alloc();
-    const std::size_t now = gHeapInUse += malloc_usable_size(p);
-    std::size_t peak = gHeapPeak.load();
-    while (now > peak && !gHeapPeak.compare_exchange_weak(peak, now)) {
-    }
-    return p;
-}
-
-void CountedFree(void* p)
-{
-    if (!p) return;
-    gHeapInUse -= malloc_usable_size(p);
-    std::free(p);
-}
-}  // namespace
-
-void* operator new(std::size_t size) { return CountedAlloc(size); }
-void* operator new[](std::size_t size) { return CountedAlloc(size); }
-void operator delete(void* p) noexcept { CountedFree(p); }
-void operator delete[](void* p) noexcept { CountedFree(p); }
-void operator delete(void* p, std::size_t) noexcept { CountedFree(p); }
-void operator delete[](void* p, std::size_t) noexcept { CountedFree(p); }
+using zonbench::gHeapInUse;
+using zonbench::gHeapPeak;
 
 namespace {
 
