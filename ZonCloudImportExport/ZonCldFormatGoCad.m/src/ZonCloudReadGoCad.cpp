@@ -377,13 +377,9 @@ const unsigned* ZonCloudReadGoCad::GetTrianglesInBox(const ZonMathBox& box, unsi
                                                      unsigned& vertexCount)
 {
     Analyse();
-    if (box.IsSameAs(_boundingBox)) {
-        vertices = FloatVertices();
-        vertexCount = static_cast<unsigned>(_vertexCount);
-        _cursor.SetBoxTriangles(_triangles.data(), _triangles.size() / 3);
-        count = static_cast<unsigned>(_triangles.size() / 3);
-        return _triangles.data();
-    }
+    if (box.IsSameAs(_boundingBox))
+        return ZonCloudSubMesh::Give(_cursor, count, vertices, vertexCount, FloatVertices(), _vertexCount, _triangles.data(),
+                                     _triangles.size() / 3);
     if (!_sub.IsFor(box)) {
         Allocating([&] {
             if (_inDouble)
@@ -394,11 +390,7 @@ const unsigned* ZonCloudReadGoCad::GetTrianglesInBox(const ZonMathBox& box, unsi
                              _triangles.size() / 3);
         });
     }
-    vertices = _sub.Vertices().data();
-    vertexCount = _sub.VertexCount();
-    _cursor.SetBoxTriangles(_sub.Triangles().data(), _sub.TriangleCount());
-    count = _sub.TriangleCount();
-    return _sub.Triangles().data();
+    return _sub.Answer(_cursor, count, vertices, vertexCount);
 }
 
 const std::vector<ZonCloudPolygonPart>& ZonCloudReadGoCad::GetPolygonParts()

@@ -575,13 +575,9 @@ const unsigned* ZonCloudReadStl::GetTrianglesInBox(const ZonMathBox& box, unsign
                                                    unsigned& vertexCount)
 {
     LoadMesh();
-    if (box.IsSameAs(_boundingBox)) {
-        vertices = FloatVertices();
-        vertexCount = DistinctCount();
-        _cursor.SetBoxTriangles(_triangles.data(), _triangles.size() / 3);
-        count = static_cast<unsigned>(_triangles.size() / 3);
-        return _triangles.data();
-    }
+    if (box.IsSameAs(_boundingBox))
+        return ZonCloudSubMesh::Give(_cursor, count, vertices, vertexCount, FloatVertices(), DistinctCount(), _triangles.data(),
+                                     _triangles.size() / 3);
     if (!_sub.IsFor(box)) {
         Allocating([&] {
             if (_meshInDouble)
@@ -592,9 +588,5 @@ const unsigned* ZonCloudReadStl::GetTrianglesInBox(const ZonMathBox& box, unsign
                              _triangles.size() / 3);
         });
     }
-    vertices = _sub.Vertices().data();
-    vertexCount = _sub.VertexCount();
-    _cursor.SetBoxTriangles(_sub.Triangles().data(), _sub.TriangleCount());
-    count = _sub.TriangleCount();
-    return _sub.Triangles().data();
+    return _sub.Answer(_cursor, count, vertices, vertexCount);
 }

@@ -159,21 +159,13 @@ const unsigned* ZonCloudReadGridMesh::GetTrianglesInBox(const ZonMathBox& box, u
 {
     Analyse();
     // The file's own box gives everything, void samples included.
-    if (box.IsSameAs(_boundingBox)) {
-        vertices = _points.data();
-        vertexCount = static_cast<unsigned>(_points.size() / 3);
-        _cursor.SetBoxTriangles(_triangles.data(), _triangles.size() / 3);
-        count = static_cast<unsigned>(_triangles.size() / 3);
-        return _triangles.data();
-    }
+    if (box.IsSameAs(_boundingBox))
+        return ZonCloudSubMesh::Give(_cursor, count, vertices, vertexCount, _points.data(), _points.size() / 3,
+                                     _triangles.data(), _triangles.size() / 3);
     if (!_sub.IsFor(box))
         Allocating([&] {
             _sub.Compute(box, _boundingBox, _points.data(), _points.size() / 3, _triangles.data(),
                          _triangles.size() / 3, _valid.empty() ? nullptr : _valid.data());
         });
-    vertices = _sub.Vertices().data();
-    vertexCount = _sub.VertexCount();
-    _cursor.SetBoxTriangles(_sub.Triangles().data(), _sub.TriangleCount());
-    count = _sub.TriangleCount();
-    return _sub.Triangles().data();
+    return _sub.Answer(_cursor, count, vertices, vertexCount);
 }

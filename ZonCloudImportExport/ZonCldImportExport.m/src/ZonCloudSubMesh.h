@@ -4,6 +4,7 @@
 #include <vector>
 
 #include "ZonCldExport.h"
+#include "ZonCloudPolygonCursor.h"
 #include "ZonMath.h"
 
 // The part of a mesh inside a query box: the triangles whose three vertices
@@ -28,6 +29,26 @@ public:
     const std::vector<std::uint32_t>& Triangles() const { return _triangles; }
     unsigned VertexCount() const { return static_cast<unsigned>(_vertices.size() / 3); }
     unsigned TriangleCount() const { return static_cast<unsigned>(_triangles.size() / 3); }
+
+    // The answer of a mesh reader's GetTrianglesInBox: this sub-mesh, whose
+    // triangles the cursor then walks one by one.
+    const unsigned* Answer(ZonCloudPolygonCursor& cursor, unsigned& count, const float*& vertices,
+                           unsigned& vertexCount) const
+    {
+        return Give(cursor, count, vertices, vertexCount, _vertices.data(), VertexCount(), _triangles.data(),
+                    TriangleCount());
+    }
+    // The same answer for a query with the file's own box: the whole mesh, no copy.
+    static const unsigned* Give(ZonCloudPolygonCursor& cursor, unsigned& count, const float*& vertices,
+                                unsigned& vertexCount, const float* meshVertices, std::size_t meshVertexCount,
+                                const std::uint32_t* triangles, std::size_t triangleCount)
+    {
+        vertices = meshVertices;
+        vertexCount = static_cast<unsigned>(meshVertexCount);
+        cursor.SetBoxTriangles(triangles, triangleCount);
+        count = static_cast<unsigned>(triangleCount);
+        return triangles;
+    }
 
 private:
     template <class T>
