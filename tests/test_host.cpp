@@ -1,6 +1,10 @@
 // Host stand-in services the module relies on.
 #include <gtest/gtest.h>
 
+#include <cmath>
+#include <limits>
+
+#include "ZonCldPointArray.h"
 #include "ZonCldSettings.h"
 #include "ZonError.h"
 #include "ZonICkeUnit.h"
@@ -37,6 +41,35 @@ TEST(HostMath, BoxIntersectionAndSameness)
     empty.AddPoint(3, -1, 2);
     empty.AddPoint(-3, 1, 0);
     EXPECT_TRUE(empty.IsSameAs(ZonMathBox(-3, 3, -1, 1, 0, 2)));
+}
+
+// The box of a point array leaves out whole points with a coordinate that is
+// not finite, wherever they fall among the others, in both precisions.
+TEST(HostMath, PointArrayBoxSkipsPointsThatAreNotFinite)
+{
+    const float inf = std::numeric_limits<float>::infinity(), nan = std::nanf("");
+    for (std::size_t count : {1u, 4u, 5u, 9u, 103u}) {
+        for (std::size_t odd = 0; odd < count; odd += 3) {
+            std::vector<float> xyz;
+            for (std::size_t i = 0; i < count; ++i)
+                xyz.insert(xyz.end(), {float(i), -float(i), 0.5f * float(i)});
+            xyz[3 * odd + odd % 3] = odd % 2 ? inf : nan;  // point `odd` takes no part
+            ZonCldPointArray floats, doubles;
+            floats.AdoptScaled(std::vector<float>(xyz), 1.0);
+            doubles.AssignScaled(std::vector<double>(xyz.begin(), xyz.end()).data(), count, 1.0);
+            const double first = odd == 0 ? 1 : 0, last = odd == count - 1 ? double(count) - 2 : double(count) - 1;
+            for (const ZonCldPointArray* points : {&floats, &doubles}) {
+                ZonMathBox box;
+                points->AddToBox(box);
+                if (count == 1) {
+                    EXPECT_TRUE(box.IsEmpty());
+                    continue;
+                }
+                EXPECT_TRUE(box.IsSameAs(ZonMathBox(first, last, -last, -first, 0.5 * first, 0.5 * last)))
+                    << count << " points, point " << odd;
+            }
+        }
+    }
 }
 
 TEST(HostRegistry, ImplementersAreListedInAStableOrderAndCreatedByName)

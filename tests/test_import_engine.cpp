@@ -4,6 +4,7 @@
 
 #include "MemoryReaders.h"
 #include "ZonCldImportEngine.h"
+#include "ZonCloudOwnedArrays.h"
 #include "ZonCloudReadNLSTool.h"
 #include "ZonMsgCatalog.h"
 #include "ZonTestFiles.h"
@@ -231,6 +232,66 @@ TEST(ImportEngine, PolygonsTheirTrianglesAndTheReadersSubMesh)
     EXPECT_EQ(r.body->GetPolygons()[0]->Triangles(), (std::vector<unsigned>{0, 1, 2}));
     ASSERT_EQ(r.messages.size(), 1u);
     EXPECT_NE(r.messages[0].find(": 1"), std::string::npos);
+}
+
+// The same reader, offering its whole arrays to be taken over.
+class HandingReader : public MemoryReader {
+public:
+    using MemoryReader::MemoryReader;
+    std::size_t Held() const
+    {
+        std::size_t n = _sampled.size() + _content.colors.size() + _content.alphas.size();
+        for (const auto& mesh : _content.meshes) n += mesh.vertices.size() + mesh.triangles.size();
+        return n;
+    }
+
+protected:
+    void ListOwnedArrays(ZonCloudOwnedArrays& arrays) override
+    {
+        arrays.Add(_sampled);
+        arrays.Add(_content.colors);
+        arrays.Add(_content.alphas);
+        for (auto& mesh : _content.meshes) {
+            arrays.Add(mesh.vertices);
+            arrays.Add(mesh.triangles);
+        }
+    }
+};
+
+TEST(ImportEngine, ArraysTakenOverGiveTheBodyThatCopiesGive)
+{
+    MemoryContent broken = MeshContent();
+    broken.meshes[0].triangles = {0, 1, 2, 0, 2, 4, 2, 3, 0};
+    const Settings box{.box = ZonMathBox(-1, 6, -1, 1, -1, 1)};
+    for (const MemoryContent& content : {CloudContent(), MeshContent(), broken}) {
+        // (The test reader's own box query needs valid triangles.)
+        for (const Settings& s : {Settings{}, Settings{.scale = 2.5}, content.meshes.empty() ? box : Settings{}}) {
+            const Import copied = Walk(content, s);
+            ZonGeoFactoryProtected factory;
+            Import taken{factory.CreateCldBody(), {}, {}};
+            const auto reader = std::make_shared<HandingReader>("f", content);
+            ZonCldImportEngine::InsertFile(*taken.body, factory, reader, false, s.unit, s.box, s.scale, taken.messages,
+                                           taken.statistics, true, ModuleLabel);
+            // Taken over when the whole file is imported; a box query copies what it kept.
+            EXPECT_EQ(reader->Held() == 0, s.box.IsEmpty());
+            EXPECT_EQ(taken.statistics, copied.statistics);
+            EXPECT_EQ(taken.messages, copied.messages);
+            ASSERT_EQ(taken.body->GetClouds().size(), copied.body->GetClouds().size());
+            for (std::size_t i = 0; i < copied.body->GetClouds().size(); ++i) {
+                const ZonCldCloud &a = *taken.body->GetClouds()[i], &b = *copied.body->GetClouds()[i];
+                EXPECT_EQ(FloatsOf(a.Points()), FloatsOf(b.Points()));
+                EXPECT_EQ(a.Colors(), b.Colors());
+                EXPECT_EQ(a.Alphas(), b.Alphas());
+                EXPECT_EQ(a.Symbols(), b.Symbols());
+            }
+            ASSERT_EQ(taken.body->GetPolygons().size(), copied.body->GetPolygons().size());
+            for (std::size_t i = 0; i < copied.body->GetPolygons().size(); ++i) {
+                const ZonCldPolygon &a = *taken.body->GetPolygons()[i], &b = *copied.body->GetPolygons()[i];
+                EXPECT_EQ(FloatsOf(a.Vertices()), FloatsOf(b.Vertices()));
+                EXPECT_EQ(a.Triangles(), b.Triangles());
+            }
+        }
+    }
 }
 
 TEST(ImportEngine, AReaderWithoutTheInterfaceOfItsTypeIsReadAsACloud)

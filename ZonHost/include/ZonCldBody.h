@@ -1,4 +1,6 @@
 #pragma once
+#include <mutex>
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -17,10 +19,26 @@ class ZON_HOST_API ZonCldBody : public ZonBaseUnknown {
 public:
     ~ZonCldBody() override;
 
-    void AddCloud(ZonCldCloud_var cloud) { _clouds.push_back(std::move(cloud)); }
-    void AddSetOfScans(ZonCldSetOfScans_var set) { _setsOfScans.push_back(std::move(set)); }
-    void AddSetOfGrids(ZonCldSetOfGrids_var set) { _setsOfGrids.push_back(std::move(set)); }
-    void AddPolygon(ZonCldPolygon_var polygon) { _polygons.push_back(std::move(polygon)); }
+    void AddCloud(ZonCldCloud_var cloud)
+    {
+        _clouds.push_back(std::move(cloud));
+        Changed();
+    }
+    void AddSetOfScans(ZonCldSetOfScans_var set)
+    {
+        _setsOfScans.push_back(std::move(set));
+        Changed();
+    }
+    void AddSetOfGrids(ZonCldSetOfGrids_var set)
+    {
+        _setsOfGrids.push_back(std::move(set));
+        Changed();
+    }
+    void AddPolygon(ZonCldPolygon_var polygon)
+    {
+        _polygons.push_back(std::move(polygon));
+        Changed();
+    }
 
     const std::vector<ZonCldCloud_var>& GetClouds() const { return _clouds; }
     const std::vector<ZonCldSetOfScans_var>& GetSetsOfScans() const { return _setsOfScans; }
@@ -35,7 +53,8 @@ public:
     std::size_t GetNumberOfTriangles() const;
     // Cloud and scan points, valid grid points and polygon vertices.
     std::size_t GetNumberOfPoints() const;
-    // Box of those points (empty when there is none).
+    // Box of those points (empty when there is none). Computed once: an
+    // entity is complete when it is added, and adding one forgets the box.
     ZonMathBox GetBox() const;
     bool IsEmpty() const { return GetNumberOfPoints() == 0; }
 
@@ -49,6 +68,12 @@ public:
     void SetPlacement(const ZonMathTransformation& placement) { _placement = placement; }
 
 private:
+    void Changed()
+    {
+        std::lock_guard lock(_boxMutex);
+        _box.reset();
+    }
+
     std::vector<ZonCldCloud_var> _clouds;
     std::vector<ZonCldSetOfScans_var> _setsOfScans;
     std::vector<ZonCldSetOfGrids_var> _setsOfGrids;
@@ -56,5 +81,9 @@ private:
     int _typeOfDigitization = 0;
     std::string _unitName;
     ZonMathTransformation _placement;
+    // Walking every point for the box is the slow part of a summary; two
+    // threads may ask at once.
+    mutable std::mutex _boxMutex;
+    mutable std::optional<ZonMathBox> _box;
 };
 using ZonCldBody_var = std::shared_ptr<ZonCldBody>;

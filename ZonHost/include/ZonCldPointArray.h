@@ -12,6 +12,9 @@ public:
     // Replaces the content with count points of xyz, each coordinate multiplied by factor.
     void AssignScaled(const float* xyz, std::size_t count, double factor);
     void AssignScaled(const double* xyz, std::size_t count, double factor);
+    // Takes xyz over (three values per point), each multiplied by factor in place.
+    void AdoptScaled(std::vector<float>&& xyz, double factor);
+    void AdoptScaled(std::vector<double>&& xyz, double factor);
     // Keeps only the points at the given indices, in that order.
     void Select(const std::vector<std::size_t>& indices);
 

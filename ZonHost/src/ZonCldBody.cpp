@@ -50,7 +50,9 @@ std::size_t ZonCldBody::GetNumberOfPoints() const
 
 ZonMathBox ZonCldBody::GetBox() const
 {
-    ZonMathBox box;
+    std::lock_guard lock(_boxMutex);
+    if (_box) return *_box;
+    ZonMathBox& box = _box.emplace();
     for (const auto& cloud : _clouds) cloud->Points().AddToBox(box);
     for (const auto& set : _setsOfScans)
         for (const auto& scan : set->GetScans()) scan->Points().AddToBox(box);

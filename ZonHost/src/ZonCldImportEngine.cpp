@@ -1,5 +1,6 @@
 #include "ZonCldImportEngine.h"
 
+#include <algorithm>
 #include <charconv>
 #include <cstdint>
 #include <new>
@@ -9,6 +10,7 @@
 // The engine talks to readers through the module's public interfaces only.
 #include "ZonICloudReadFile.h"
 #include "ZonICloudReadFileCounts.h"
+#include "ZonICloudReadHandOver.h"
 #include "ZonICloudReadPointTextValues.h"
 #include "ZonICloudReadGridFile.h"
 #include "ZonICloudReadPolygonFile.h"
@@ -51,9 +53,14 @@ std::vector<std::size_t> IndicesOfKept(const T* kept, std::size_t keptCount, con
 
 template <class T>
 std::vector<T> SelectPerPoint(const T* values, std::size_t perPoint, const std::vector<std::size_t>* indices,
-                              std::size_t count)
+                              std::size_t count, ZonICloudReadHandOver* handOver)
 {
-    if (!indices) return std::vector<T>(values, values + perPoint * count);
+    if (!indices) {
+        std::vector<T> taken;
+        if constexpr (requires { handOver->HandOver(values, count, taken); })
+            if (handOver && handOver->HandOver(values, perPoint * count, taken)) return taken;
+        return std::vector<T>(values, values + perPoint * count);
+    }
     std::vector<T> selected;
     selected.reserve(perPoint * indices->size());
     for (std::size_t index : *indices)
@@ -67,7 +74,8 @@ public:
            const std::shared_ptr<ZonICloudReadFile>& handle, const ZonMathBox& box, double factor,
            bool createTriangles, std::vector<std::string>& messages, const ZonCldStatLabeler& labeler)
         : _body(body), _factory(factory), _reader(reader), _handle(handle), _box(box), _clip(!box.IsEmpty()),
-          _factor(factor), _createTriangles(createTriangles), _messages(messages), _labeler(labeler)
+          _factor(factor), _createTriangles(createTriangles), _messages(messages), _labeler(labeler),
+          _handOver(box.IsEmpty() ? ZonQueryInterface<ZonICloudReadHandOver>(handle) : nullptr)
     {
     }
 
@@ -127,10 +135,15 @@ private:
         if (!points) return false;
         if (count == 0) return true;
         ZonCldCloud_var cloud = _factory.CreateCloud();
-        cloud->Points().AssignScaled(points, count, _factor);
         std::vector<T> kept;
         if (_clip) kept.assign(points, points + 3 * static_cast<std::size_t>(count));
         KeepPerPointArrays<T>(*cloud, kept, count);
+        // The points last: once taken over, the reader no longer has them.
+        std::vector<T> taken;
+        if (_handOver && _handOver->HandOver(points, 3 * static_cast<std::size_t>(count), taken))
+            cloud->Points().AdoptScaled(std::move(taken), _factor);
+        else
+            cloud->Points().AssignScaled(points, count, _factor);
         _body.AddCloud(std::move(cloud));
         return true;
     }
@@ -163,13 +176,15 @@ private:
             if (indices.size() != keptCount) return;
             selection = &indices;
         }
-        if (colors && colorCount == total) cloud.Colors() = SelectPerPoint(colors, 3, selection, total);
-        if (alphas && alphaCount == total) cloud.Alphas() = SelectPerPoint(alphas, 1, selection, total);
-        if (symbols && symbolCount == total) cloud.Symbols() = SelectPerPoint(symbols, 1, selection, total);
+        ZonICloudReadHandOver* handOver = _handOver.get();
+        if (colors && colorCount == total) cloud.Colors() = SelectPerPoint(colors, 3, selection, total, handOver);
+        if (alphas && alphaCount == total) cloud.Alphas() = SelectPerPoint(alphas, 1, selection, total, handOver);
+        if (symbols && symbolCount == total) cloud.Symbols() = SelectPerPoint(symbols, 1, selection, total, handOver);
         if (textValues && textValueCount == total)
-            cloud.SetTextValues(textLabel.ToUtf8(), SelectPerPoint(textValues, 1, selection, total));
+            cloud.SetTextValues(textLabel.ToUtf8(), SelectPerPoint(textValues, 1, selection, total, handOver));
         if (texts && textCount == total) {
-            for (std::string& text : SelectPerPoint(texts, 1, selection, total)) cloud.Texts().emplace_back(std::move(text));
+            for (std::string& text : SelectPerPoint(texts, 1, selection, total, nullptr))
+                cloud.Texts().emplace_back(std::move(text));
         }
     }
 
@@ -265,8 +280,12 @@ private:
             }
             if (!vertices || vertexCount == 0) continue;
             ZonCldPolygon_var polygon = _factory.CreatePolygon();
-            polygon->Vertices().AssignScaled(vertices, vertexCount, _factor);
             if (_createTriangles && triangles) KeepTriangles(*polygon, triangles, triangleCount, vertexCount);
+            std::vector<float> taken;
+            if (_handOver && _handOver->HandOver(vertices, 3 * static_cast<std::size_t>(vertexCount), taken))
+                polygon->Vertices().AdoptScaled(std::move(taken), _factor);
+            else
+                polygon->Vertices().AssignScaled(vertices, vertexCount, _factor);
             _body.AddPolygon(std::move(polygon));
         }
     }
@@ -274,16 +293,32 @@ private:
     void KeepTriangles(ZonCldPolygon& polygon, const unsigned* triangles, unsigned count, unsigned vertexCount)
     {
         std::vector<unsigned>& kept = polygon.Triangles();
-        kept.reserve(3 * static_cast<std::size_t>(count));
+        const std::size_t values = 3 * static_cast<std::size_t>(count);
         std::size_t skipped = 0;
-        for (std::size_t t = 0; t < count; ++t) {
-            const unsigned* v = triangles + 3 * t;
-            // An index past the vertices would make the mesh unusable: leave that triangle out.
-            if (v[0] >= vertexCount || v[1] >= vertexCount || v[2] >= vertexCount) {
-                ++skipped;
-                continue;
+        if (_handOver && _handOver->HandOver(triangles, values, kept)) {
+            // Taken over: the triangles to leave out are squeezed out in place.
+            std::size_t to = 0;
+            for (std::size_t from = 0; from < values; from += 3) {
+                const unsigned* v = kept.data() + from;
+                if (v[0] >= vertexCount || v[1] >= vertexCount || v[2] >= vertexCount) {
+                    ++skipped;
+                    continue;
+                }
+                if (to != from) std::copy(v, v + 3, kept.data() + to);
+                to += 3;
             }
-            kept.insert(kept.end(), v, v + 3);
+            kept.resize(to);
+        } else {
+            kept.reserve(values);
+            for (std::size_t t = 0; t < count; ++t) {
+                const unsigned* v = triangles + 3 * t;
+                // An index past the vertices would make the mesh unusable: leave that triangle out.
+                if (v[0] >= vertexCount || v[1] >= vertexCount || v[2] >= vertexCount) {
+                    ++skipped;
+                    continue;
+                }
+                kept.insert(kept.end(), v, v + 3);
+            }
         }
         if (skipped > 0)
             _messages.push_back(Label(_labeler, "InvalidTriangles") + ": " + std::to_string(skipped));
@@ -299,6 +334,8 @@ private:
     const bool _createTriangles;
     std::vector<std::string>& _messages;
     const ZonCldStatLabeler& _labeler;
+    // Offered by readers whose arrays may be taken over; never after a box query.
+    const std::shared_ptr<ZonICloudReadHandOver> _handOver;
     bool _double = false;
 };
 

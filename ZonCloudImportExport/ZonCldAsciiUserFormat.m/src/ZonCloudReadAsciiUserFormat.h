@@ -8,6 +8,7 @@
 #include "ZonCloudReadFile.h"
 #include "ZonICloudReadOptColor.h"
 #include "ZonICloudReadOptUserFormat.h"
+#include "ZonCloudOwnedArrays.h"
 
 class ZonCloudLineSource;
 
@@ -77,6 +78,15 @@ public:
     std::uint64_t GetCapacity() const { return _capacity; }
 
 protected:
+    // What an importer may take over at the end of an import.
+    void ListOwnedArrays(ZonCloudOwnedArrays& arrays) override
+    {
+        arrays.Add(_points);
+        arrays.Add(_pointsDouble);
+        arrays.Add(_colors);
+        arrays.Add(_alphas);
+        arrays.Add(_symbols);
+    }
     // Loads the file when an FDF was read; without one there is nothing to read.
     void AnalyseFile() override;
 

@@ -9,6 +9,7 @@
 #include "ZonICloudReadOptDelimitor.h"
 #include "ZonICloudReadOptDirection.h"
 #include "ZonTieCloudReadFile.h"
+#include "ZonCloudOwnedArrays.h"
 
 // Free ASCII point files: one point per line, three numbers in a layout of
 // labels and separators found from the file itself ("1.5 2.0 3.25",
@@ -60,6 +61,12 @@ public:
     const std::string& GetLineFormat() const { return _format.Text(); }
 
 protected:
+    // What an importer may take over at the end of an import.
+    void ListOwnedArrays(ZonCloudOwnedArrays& arrays) override
+    {
+        arrays.Add(_points);
+        arrays.Add(_pointsDouble);
+    }
     void AnalyseFile() override;
 
 private:

@@ -7,6 +7,7 @@
 #include "ZonCloudReadFile.h"
 #include "ZonICloudReadFileCounts.h"
 #include "ZonICloudReadPointTextValues.h"
+#include "ZonCloudOwnedArrays.h"
 
 // Reads medical image slices as one cloud: every pixel of every slice is a
 // point placed by the slice's position, orientation and pixel spacing, with
@@ -43,6 +44,15 @@ public:
     // the slice's least and greatest.
     static unsigned char Grey(const ZonCloudDicomSlice& slice, std::int32_t raw, std::int32_t least,
                               std::int32_t greatest);
+
+protected:
+    // What an importer may take over at the end of an import.
+    void ListOwnedArrays(ZonCloudOwnedArrays& arrays) override
+    {
+        arrays.Add(_points);
+        arrays.Add(_colors);
+        arrays.Add(_densities);
+    }
 
 private:
     void AnalyseFile() override;

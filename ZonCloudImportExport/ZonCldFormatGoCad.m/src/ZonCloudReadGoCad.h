@@ -9,6 +9,7 @@
 #include "ZonICloudReadOptTriangles.h"
 #include "ZonICloudReadPolygonFile.h"
 #include "ZonICloudReadPolygonParts.h"
+#include "ZonCloudOwnedArrays.h"
 
 class ZonCloudLineSource;
 
@@ -59,6 +60,13 @@ public:
     unsigned GetNumberOfControlNodes();
 
 protected:
+    // What an importer may take over at the end of an import.
+    void ListOwnedArrays(ZonCloudOwnedArrays& arrays) override
+    {
+        arrays.Add(_vertices);
+        arrays.Add(_verticesDouble);
+        arrays.Add(_triangles);
+    }
     void AnalyseFile() override;
 
 private:

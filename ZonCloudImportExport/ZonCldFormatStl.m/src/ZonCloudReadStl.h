@@ -9,6 +9,7 @@
 #include "ZonICloudReadOptFreeEdges.h"
 #include "ZonICloudReadOptTriangles.h"
 #include "ZonICloudReadPolygonFile.h"
+#include "ZonCloudOwnedArrays.h"
 
 // Reads stereolithography files, text or binary, as one triangle mesh: the
 // distinct vertices in order of first appearance and the triangles in file
@@ -58,6 +59,13 @@ public:
     bool IsTextFile();
 
 protected:
+    // What an importer may take over at the end of an import.
+    void ListOwnedArrays(ZonCloudOwnedArrays& arrays) override
+    {
+        arrays.Add(_vertices);
+        arrays.Add(_verticesDouble);
+        arrays.Add(_triangles);
+    }
     void AnalyseFile() override;
 
 private:

@@ -8,6 +8,7 @@
 #include <typeinfo>
 
 #include "ZonCloudOperErrorTool.h"
+#include "ZonCloudOwnedArrays.h"
 #include "ZonCloudReadNLSTool.h"
 
 ZonCloudReadFile::ZonCloudReadFile(const ZonUnicodeString& fileName) : _fileName(fileName) {}
@@ -81,6 +82,37 @@ bool ZonCloudReadFile::IsTypeOfDigitization(int type)
 ZonICkeUnit_var ZonCloudReadFile::GetLengthUnit() { return nullptr; }
 
 bool ZonCloudReadFile::HasDoublePrecision() { return false; }
+
+void ZonCloudReadFile::ListOwnedArrays(ZonCloudOwnedArrays&) {}
+
+template <class T>
+bool ZonCloudReadFile::TakeOwned(const T* data, std::size_t count, std::vector<T>& into)
+{
+    ZonCloudOwnedArrays arrays;
+    ListOwnedArrays(arrays);
+    return arrays.Take(data, count, into);
+}
+
+bool ZonCloudReadFile::HandOver(const float* data, std::size_t count, std::vector<float>& into)
+{
+    return TakeOwned(data, count, into);
+}
+bool ZonCloudReadFile::HandOver(const double* data, std::size_t count, std::vector<double>& into)
+{
+    return TakeOwned(data, count, into);
+}
+bool ZonCloudReadFile::HandOver(const std::uint32_t* data, std::size_t count, std::vector<std::uint32_t>& into)
+{
+    return TakeOwned(data, count, into);
+}
+bool ZonCloudReadFile::HandOver(const std::int32_t* data, std::size_t count, std::vector<std::int32_t>& into)
+{
+    return TakeOwned(data, count, into);
+}
+bool ZonCloudReadFile::HandOver(const unsigned char* data, std::size_t count, std::vector<unsigned char>& into)
+{
+    return TakeOwned(data, count, into);
+}
 
 void ZonCloudReadFile::BeginGetSetOfScans() {}
 bool ZonCloudReadFile::NextSetOfScans() { return false; }

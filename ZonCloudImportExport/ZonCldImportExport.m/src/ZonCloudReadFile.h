@@ -8,6 +8,9 @@
 #include "ZonCldExport.h"
 #include "ZonCloudByteSource.h"
 #include "ZonICloudReadFile.h"
+#include "ZonICloudReadHandOver.h"
+
+class ZonCloudOwnedArrays;
 
 // Base of every reader: file name, byte source, sampling percent, type of
 // digitization, double-precision mode, and the one-box cache of clipped points.
@@ -15,7 +18,7 @@
 // on the first question that needs content, closes the source on any failure
 // and turns memory exhaustion into the memory error. A derived reader writes
 // the hook and the point queries; the base answers everything else.
-class ZON_CLD_API ZonCloudReadFile : public ZonBaseUnknown, public ZonICloudReadFile {
+class ZON_CLD_API ZonCloudReadFile : public ZonBaseUnknown, public ZonICloudReadFile, public ZonICloudReadHandOver {
 public:
     explicit ZonCloudReadFile(const ZonUnicodeString& fileName);
     ~ZonCloudReadFile() override;
@@ -41,6 +44,13 @@ public:
     bool IsTypeOfDigitization(int type) override;
     ZonICkeUnit_var GetLengthUnit() override;
     bool HasDoublePrecision() override;
+
+    // ZonICloudReadHandOver, over the arrays the reader lists in ListOwnedArrays.
+    bool HandOver(const float* data, std::size_t count, std::vector<float>& into) override;
+    bool HandOver(const double* data, std::size_t count, std::vector<double>& into) override;
+    bool HandOver(const std::uint32_t* data, std::size_t count, std::vector<std::uint32_t>& into) override;
+    bool HandOver(const std::int32_t* data, std::size_t count, std::vector<std::int32_t>& into) override;
+    bool HandOver(const unsigned char* data, std::size_t count, std::vector<unsigned char>& into) override;
 
     // Defaults of the scan and grid protocols; readers that offer those
     // interfaces override what they need (see ZonTieCloudReadScanFile).
@@ -137,6 +147,9 @@ protected:
     }
     // Frees the three box caches and marks the cached box empty.
     void ClearBoxCaches();
+    // The whole arrays whose start the reader's answers give (points, triangles,
+    // colours, ...), which an importer may take over; none by default.
+    virtual void ListOwnedArrays(ZonCloudOwnedArrays& arrays);
 
     ZonUnicodeString _fileName;
     ZonCloudByteSource _source;
@@ -160,6 +173,8 @@ protected:
     bool _analysed = false;
 
 private:
+    template <class T>
+    bool TakeOwned(const T* data, std::size_t count, std::vector<T>& into);
     template <class T>
     const T* PointsInBox(const ZonMathBox& box, unsigned& count, const T* points, unsigned n,
                          std::vector<T>& cache, bool& hasCache);

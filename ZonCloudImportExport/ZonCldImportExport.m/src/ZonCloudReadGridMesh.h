@@ -9,6 +9,7 @@
 #include "ZonCloudSubMesh.h"
 #include "ZonICloudReadOptTriangles.h"
 #include "ZonICloudReadPolygonFile.h"
+#include "ZonCloudOwnedArrays.h"
 
 // Common base of the readers of height rasters (terrain grids), which give
 // their file as one polygon: a point per sample and two triangles per cell of
@@ -52,6 +53,13 @@ public:
     static constexpr const char* VoidText = "InvalidPoint";
 
 protected:
+    // What an importer may take over at the end of an import.
+    void ListOwnedArrays(ZonCloudOwnedArrays& arrays) override
+    {
+        arrays.Add(_points);
+        arrays.Add(_pointsDouble);
+        arrays.Add(_triangles);
+    }
     // The triangles of `rows` rows of `columns` points, in row order: for the
     // cell whose first point is b, (b, b + columns, b + 1) then
     // (b + 1, b + columns, b + columns + 1). A triangle with a corner at or

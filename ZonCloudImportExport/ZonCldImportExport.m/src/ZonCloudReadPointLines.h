@@ -7,6 +7,7 @@
 #include "ZonCloudLineSource.h"
 #include "ZonCloudReadFile.h"
 #include "ZonCloudScanFormat.h"
+#include "ZonCloudOwnedArrays.h"
 
 // Base of the readers of text files with one point per line: an optional
 // first line with the number of points, then point lines up to an optional
@@ -27,6 +28,13 @@ public:
     bool IsDecimalPointSwapped() const { return _decimalSwapped; }
 
 protected:
+    // What an importer may take over at the end of an import.
+    void ListOwnedArrays(ZonCloudOwnedArrays& arrays) override
+    {
+        arrays.Add(_points);
+        arrays.Add(_pointsDouble);
+        arrays.Add(_colors);
+    }
     explicit ZonCloudReadPointLines(const ZonUnicodeString& fileName);
 
     // Scans the line [first, last) in the precision being loaded: false when
