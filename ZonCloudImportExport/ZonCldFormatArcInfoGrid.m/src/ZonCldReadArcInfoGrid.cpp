@@ -196,7 +196,7 @@ void ZonCldReadArcInfoGrid::ReadCells(std::uint64_t offset)
     Resize(ys, columns);
     for (std::uint64_t c = 0; c < columns; ++c)
         ys[c] = static_cast<float>(static_cast<double>(c) * _header.ColumnStep() + _header.yCorner);
-    _points.resize(3 * cells);
+    Resize(_points, 3 * cells);
     ValueReader values(source, offset);
     float* p = _points.data();
     for (std::uint64_t r = 0; r < rows; ++r) {

@@ -1,11 +1,14 @@
 #include "ZonCldReadSRTM.h"
 
+#include <algorithm>
 #include <cmath>
 #include <limits>
 
+#include "ZonCloudWorkerPool.h"
+
 namespace {
 constexpr std::int16_t kVoid = -32768;
-constexpr std::size_t kBlock = std::size_t(1) << 20;  // bytes read at a time, even
+constexpr std::size_t kBlock = std::size_t(1) << 18;  // samples placed at a time
 }  // namespace
 
 ZonCldReadSRTM::ZonCldReadSRTM(const ZonUnicodeString& fileName) : ZonCloudReadGridMesh(fileName) {}
@@ -30,42 +33,43 @@ void ZonCldReadSRTM::AnalyseFile()
     while (static_cast<std::uint64_t>(_side) * _side > count) --_side;
     while (static_cast<std::uint64_t>(_side + 1) * (_side + 1) <= count) ++_side;
 
-    _points.resize(3 * count);
+    Resize(_points, 3 * count);
     Resize(_valid, count);
-    std::vector<unsigned char> buffer(static_cast<std::size_t>(std::min<std::uint64_t>(kBlock, 2 * count)));
+    // The whole file at once (it is small beside the points), then blocks of
+    // samples on the workers.
+    std::vector<unsigned char> bytes;
+    Resize(bytes, 2 * count);
     source.Seek(0);
-    std::size_t done = 0;
-    while (done < count) {
-        const std::size_t samples = std::min<std::size_t>(buffer.size() / 2, count - done);
-        source.Read(buffer.data(), 2 * samples);
-        float* z = _points.data() + 3 * done + 2;
-        unsigned char* valid = _valid.data() + done;
-        for (std::size_t i = 0; i < samples; ++i, z += 3) {
-            const auto value = ZonCloudByteSource::LoadBig<std::int16_t>(buffer.data() + 2 * i);
+    source.Read(bytes.data(), bytes.size());
+    ZonCloudWorkerPool::Run((count + kBlock - 1) / kBlock, [&](std::size_t block) {
+        const std::size_t from = block * kBlock, to = std::min<std::size_t>(count, from + kBlock);
+        float* z = _points.data() + 3 * from + 2;
+        for (std::size_t i = from; i < to; ++i, z += 3) {
+            const auto value = ZonCloudByteSource::LoadBig<std::int16_t>(bytes.data() + 2 * i);
             *z = value;
-            valid[i] = value != kVoid;
+            _valid[i] = value != kVoid;
         }
-        done += samples;
-    }
-    Place(_points.data(), count);
+        Place(_points.data(), from, to);
+    });
+    std::vector<unsigned char>().swap(bytes);
     BuildGridTriangles(_side, _side, count);
     FinishPoints();
 }
 
-// x and y of every sample from its index; z is already in place.
 template <class T>
-void ZonCldReadSRTM::Place(T* points, std::size_t count) const
+void ZonCldReadSRTM::Place(T* points, std::size_t from, std::size_t to) const
 {
     // A one-sample row spans nothing: the step is left at 1 rather than made infinite.
     const double step = _side > 1 ? 1.0 / (_side - 1) : 1.0;
     const std::size_t side = _side ? _side : 1;
-    std::size_t k = 0;
-    for (std::size_t r = 0; k < count; ++r) {
+    std::size_t r = from / side, c = from % side;
+    for (std::size_t k = from; k < to; ++k) {
         // Rows past the last whole one go on southwards.
-        const T y = static_cast<T>((static_cast<double>(side) - 1 - static_cast<double>(r)) * step);
-        for (std::size_t c = 0; c < side && k < count; ++c, ++k) {
-            points[3 * k] = static_cast<T>(static_cast<double>(c) * step);
-            points[3 * k + 1] = y;
+        points[3 * k] = static_cast<T>(static_cast<double>(c) * step);
+        points[3 * k + 1] = static_cast<T>((static_cast<double>(side) - 1 - static_cast<double>(r)) * step);
+        if (++c == side) {
+            c = 0;
+            ++r;
         }
     }
 }
@@ -75,5 +79,5 @@ void ZonCldReadSRTM::ComputeDoublePoints(std::vector<double>& points)
     const std::size_t count = _points.size() / 3;
     points.resize(3 * count);
     for (std::size_t k = 0; k < count; ++k) points[3 * k + 2] = _points[3 * k + 2];
-    Place(points.data(), count);
+    Place(points.data(), 0, count);
 }

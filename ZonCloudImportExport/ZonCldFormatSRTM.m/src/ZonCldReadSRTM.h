@@ -23,8 +23,9 @@ protected:
     void ComputeDoublePoints(std::vector<double>& points) override;
 
 private:
+    // x and y of the samples [from, to); z is already in place.
     template <class T>
-    void Place(T* points, std::size_t count) const;
+    void Place(T* points, std::size_t from, std::size_t to) const;
 
     std::uint32_t _side = 0;
 };

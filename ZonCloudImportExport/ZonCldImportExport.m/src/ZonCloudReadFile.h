@@ -7,6 +7,7 @@
 #include "ZonBaseUnknown.h"
 #include "ZonCldExport.h"
 #include "ZonCloudByteSource.h"
+#include "ZonCloudWorkerPool.h"
 #include "ZonICloudReadFile.h"
 #include "ZonICloudReadHandOver.h"
 
@@ -125,12 +126,15 @@ protected:
             v.reserve(static_cast<std::size_t>(n));
         });
     }
-    // The same for n elements in use.
+    // The same for n elements in use. The pages of a large growth are made
+    // present on all cores before the elements are set.
     template <class T>
     void Resize(std::vector<T>& v, std::uint64_t n) const
     {
         Allocating([&] {
             if (n > v.max_size()) RaiseMemoryError();
+            if (n > v.capacity()) v.reserve(static_cast<std::size_t>(n));
+            if (n > v.size()) ZonCloudWorkerPool::Populate(v.data() + v.size(), (n - v.size()) * sizeof(T));
             v.resize(static_cast<std::size_t>(n));
         });
     }

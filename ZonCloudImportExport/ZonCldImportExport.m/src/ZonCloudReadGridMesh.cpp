@@ -1,8 +1,11 @@
 #include "ZonCloudReadGridMesh.h"
 
+#include <algorithm>
 #include <limits>
+#include <mutex>
 
 #include "ZonCloudReadNLSTool.h"
+#include "ZonCloudWorkerPool.h"
 
 using Tool = ZonCloudReadNLSTool;
 
@@ -22,59 +25,101 @@ void ZonCloudReadGridMesh::BuildGridTriangles(std::uint64_t rows, std::uint64_t 
 {
     _triangles.clear();
     if (rows < 2 || columns < 2) return;
-    // Rows of cells whose corners all exist are filled straight; in a cut
-    // last row each triangle is checked. Only rows that reach the next row
-    // have cells at all, so the loops are bounded by `points`.
+    // Rows of cells whose corners all exist come first; past them at most one
+    // row reaches into a cut last row, and there each triangle is checked.
     const auto below = [points](std::uint64_t corner) { return corner < points; };
-    std::uint64_t count = 0;
-    for (std::uint64_t r = 0; r + 1 < rows && below((r + 1) * columns); ++r) {
-        if (below((r + 2) * columns - 1)) {
-            count += 2 * (columns - 1);
-            continue;
-        }
-        for (std::uint64_t b = r * columns, c = 0; c + 1 < columns; ++c, ++b)
-            count += static_cast<std::uint64_t>(below(b + columns)) + below(b + columns + 1);
-    }
+    std::uint64_t whole = 0;
+    while (whole + 1 < rows && below((whole + 2) * columns - 1)) ++whole;
+    const bool cut = whole + 1 < rows && below((whole + 1) * columns);
+    const std::uint64_t perRow = 6 * (columns - 1);
+    std::uint64_t count = whole * perRow;
+    if (cut)
+        for (std::uint64_t b = whole * columns, c = 0; c + 1 < columns; ++c, ++b)
+            count += 3 * (static_cast<std::uint64_t>(below(b + columns)) + below(b + columns + 1));
     // Indices fit in 32 bits (ReservePoints); the count of corners must too.
-    if (3 * count > std::numeric_limits<std::uint32_t>::max()) RaiseMemoryError();
-    Resize(_triangles, 3 * count);
-    std::uint32_t* out = _triangles.data();
+    if (count > std::numeric_limits<std::uint32_t>::max()) RaiseMemoryError();
+    Resize(_triangles, count);
+
     const auto w = static_cast<std::uint32_t>(columns);
-    for (std::uint64_t r = 0; r + 1 < rows && below((r + 1) * columns); ++r) {
-        const bool whole = below((r + 2) * columns - 1);
+    const auto fill = [&](std::uint64_t r, std::uint32_t* out) {
         auto b = static_cast<std::uint32_t>(r * columns);
-        for (std::uint32_t c = 0; c + 1 < w; ++c, ++b) {
-            if (whole || below(b + columns)) {
-                out[0] = b;
-                out[1] = b + w;
-                out[2] = b + 1;
-                out += 3;
-            }
-            if (whole || below(b + columns + 1)) {
-                out[0] = b + 1;
-                out[1] = b + w;
-                out[2] = b + w + 1;
-                out += 3;
-            }
+        for (std::uint32_t c = 0; c + 1 < w; ++c, ++b, out += 6) {
+            out[0] = b;
+            out[1] = b + w;
+            out[2] = b + 1;
+            out[3] = b + 1;
+            out[4] = b + w;
+            out[5] = b + w + 1;
+        }
+    };
+    // Whole rows in blocks on the workers: each row has its own place.
+    constexpr std::uint64_t BlockRows = 64;
+    ZonCloudWorkerPool::Run(static_cast<std::size_t>((whole + BlockRows - 1) / BlockRows), [&](std::size_t block) {
+        const std::uint64_t first = block * BlockRows, last = std::min(whole, first + BlockRows);
+        for (std::uint64_t r = first; r < last; ++r) fill(r, _triangles.data() + r * perRow);
+    });
+    if (!cut) return;
+    std::uint32_t* out = _triangles.data() + whole * perRow;
+    auto b = static_cast<std::uint32_t>(whole * columns);
+    for (std::uint32_t c = 0; c + 1 < w; ++c, ++b) {
+        if (below(b + columns)) {
+            out[0] = b;
+            out[1] = b + w;
+            out[2] = b + 1;
+            out += 3;
+        }
+        if (below(std::uint64_t(b) + columns + 1)) {
+            out[0] = b + 1;
+            out[1] = b + w;
+            out[2] = b + w + 1;
+            out += 3;
         }
     }
 }
+
+namespace {
+// Lowest and highest value of each axis over n points, NaN ignored. Twelve
+// lanes hold four points, so lane j always sees axis j % 3 and the loop
+// vectorises; blocks of points go to the workers.
+void AxisRanges(const float* p, std::size_t n, float low[3], float high[3])
+{
+    constexpr std::size_t Lanes = 12, BlockPoints = std::size_t(1) << 20;
+    constexpr float Infinity = std::numeric_limits<float>::infinity();
+    for (int a = 0; a < 3; ++a) {
+        low[a] = Infinity;
+        high[a] = -Infinity;
+    }
+    std::mutex mutex;
+    ZonCloudWorkerPool::Run((n + BlockPoints - 1) / BlockPoints, [&](std::size_t block) {
+        const std::size_t from = 3 * block * BlockPoints, to = 3 * std::min(n, (block + 1) * BlockPoints);
+        float lo[Lanes], hi[Lanes];
+        std::fill_n(lo, Lanes, Infinity);
+        std::fill_n(hi, Lanes, -Infinity);
+        std::size_t i = from;
+        for (; i + Lanes <= to; i += Lanes)
+            for (std::size_t j = 0; j < Lanes; ++j) {
+                lo[j] = p[i + j] < lo[j] ? p[i + j] : lo[j];
+                hi[j] = p[i + j] > hi[j] ? p[i + j] : hi[j];
+            }
+        for (std::size_t j = 0; i < to; ++i, ++j) {
+            lo[j] = p[i] < lo[j] ? p[i] : lo[j];
+            hi[j] = p[i] > hi[j] ? p[i] : hi[j];
+        }
+        std::lock_guard lock(mutex);
+        for (std::size_t j = 0; j < Lanes; ++j) {
+            low[j % 3] = std::min(low[j % 3], lo[j]);
+            high[j % 3] = std::max(high[j % 3], hi[j]);
+        }
+    });
+}
+}  // namespace
 
 void ZonCloudReadGridMesh::FinishPoints()
 {
     const std::size_t count = _points.size() / 3;
     if (!_valid.empty()) _valid.resize(count, 1);
-    double low[3], high[3];
-    for (int axis = 0; axis < 3; ++axis) {
-        low[axis] = std::numeric_limits<double>::infinity();
-        high[axis] = -std::numeric_limits<double>::infinity();
-    }
-    const float* p = _points.data();
-    for (std::size_t i = 0; i < count; ++i, p += 3)
-        for (int axis = 0; axis < 3; ++axis) {
-            low[axis] = p[axis] < low[axis] ? p[axis] : low[axis];
-            high[axis] = p[axis] > high[axis] ? p[axis] : high[axis];
-        }
+    float low[3], high[3];
+    AxisRanges(_points.data(), count, low, high);
     _boundingBox.SetToEmpty();
     if (low[0] <= high[0] && low[1] <= high[1] && low[2] <= high[2])
         _boundingBox.SetLowHigh(ZonMathPoint(low[0], low[1], low[2]), ZonMathPoint(high[0], high[1], high[2]));

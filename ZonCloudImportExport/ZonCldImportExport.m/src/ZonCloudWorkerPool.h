@@ -16,6 +16,12 @@ public:
     // Fixes the count for this process (a setting); 0 goes back to the default.
     static void SetThreadCount(unsigned count);
 
+    // Makes the pages of freshly allocated memory present, in slices on the
+    // workers: the kernel then zeroes and maps them on both cores instead of
+    // one page fault at a time on first touch. Only worth it for large
+    // blocks; does nothing for small ones or where the system cannot.
+    static void Populate(void* data, std::size_t bytes);
+
     // Runs work(i) for every i in [0, count) on at most `threads` threads
     // (0: ThreadCount()), the calling thread included. After a failure no new
     // item starts; the failure of the lowest index is rethrown once all
