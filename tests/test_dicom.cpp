@@ -355,6 +355,24 @@ TEST(DicomSampling, KeptPointsKeepTheirGreysAndTexts)
     }
 }
 
+// The rule runs over the whole series, not slice by slice.
+TEST(DicomSampling, TheRuleRunsAcrossTheSlicesOfAnArchive)
+{
+    std::vector<std::pair<std::string, std::string>> members;
+    for (int i = 0; i < 10; ++i)
+        members.push_back({"s" + std::to_string(i) + ".dcm", ZSlice(i + 1, i, static_cast<std::uint16_t>(10 * i))});
+    const std::string archive = Zip(members);
+    ZonCloudReadDicom reader("s.dcz");
+    reader.SetSourceMemory(archive.data(), archive.size());
+    reader.SetSamplingPercent(30.0f);
+    unsigned n = 0;
+    reader.GetPoints(n);
+    const auto* t = static_cast<const std::string*>(reader.GetPointAttributes3(n));
+    ASSERT_EQ(n, 3u);
+    EXPECT_EQ(std::vector<std::string>(t, t + n),
+              (std::vector<std::string>{"Density = 0", "Density = 40", "Density = 70"}));
+}
+
 TEST(ZipReader, MembersLargerThanTheArchiveJustifiesAreRefused)
 {
     std::string big;

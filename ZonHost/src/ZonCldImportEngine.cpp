@@ -296,7 +296,12 @@ private:
         const std::size_t values = 3 * static_cast<std::size_t>(count);
         std::size_t skipped = 0;
         if (_handOver && _handOver->HandOver(triangles, values, kept)) {
-            // Taken over: the triangles to leave out are squeezed out in place.
+            // Taken over: one pass finds whether any index is out of range
+            // (readers almost never give one), and only then are the
+            // triangles to leave out squeezed out in place.
+            unsigned highest = 0;
+            for (const unsigned index : kept) highest = index > highest ? index : highest;
+            if (highest < vertexCount) return;
             std::size_t to = 0;
             for (std::size_t from = 0; from < values; from += 3) {
                 const unsigned* v = kept.data() + from;

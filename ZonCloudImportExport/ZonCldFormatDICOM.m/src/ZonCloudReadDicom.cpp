@@ -1,12 +1,13 @@
 #include "ZonCloudReadDicom.h"
 
 #include <algorithm>
-#include <array>
 #include <cfloat>
 #include <climits>
 #include <cmath>
+#include <mutex>
 
 #include "ZonCloudSampler.h"
+#include "ZonCloudWorkerPool.h"
 #include "ZonZipReader.h"
 
 namespace {
@@ -129,26 +130,41 @@ void ZonCloudReadDicom::ReadArchive()
 void ZonCloudReadDicom::BuildCloud()
 {
     _sliceCount = _slices.size();
-    std::uint64_t total = 0;
-    for (const ZonCloudDicomSlice& slice : _slices) total += slice.pixels.empty() ? 0 : slice.PixelCount();
+    // Where each slice's kept points start, and the sampling rule's state
+    // there: the rule runs over the whole series, so the slices can then be
+    // made on the workers, each into its own place.
+    struct Start {
+        std::uint64_t point;
+        ZonCloudSampler sampler;
+    };
     ZonCloudSampler sampler(_samplingPercent);
-    const std::uint64_t kept = sampler.CountKept(total);
+    std::vector<Start> starts;
+    Reserve(starts, _slices.size() + 1);
+    std::uint64_t kept = 0;
+    for (const ZonCloudDicomSlice& slice : _slices) {
+        starts.push_back({kept, sampler});
+        if (slice.pixels.empty()) continue;
+        for (std::uint64_t i = 0; i < slice.PixelCount(); ++i) kept += sampler.Keep();
+    }
     if (kept == 0) Tool::Raise(Tool::Data, "ERR_NoPointFound");
     if (kept > static_cast<std::uint64_t>(INT_MAX)) RaiseMemoryError();
-    Reserve(_points, 3 * kept);
-    Reserve(_colors, 3 * kept);
-    Reserve(_densities, kept);
+    Resize(_points, 3 * kept);
+    Resize(_colors, 3 * kept);
+    Resize(_densities, kept);
 
     float low[3] = {INFINITY, INFINITY, INFINITY}, high[3] = {-INFINITY, -INFINITY, -INFINITY};
-    std::array<unsigned char, 65536> greys{};
-    for (ZonCloudDicomSlice& slice : _slices) {
-        if (slice.pixels.empty()) continue;
+    std::mutex mutex;
+    ZonCloudWorkerPool::Run(_slices.size(), [&](std::size_t s) {
+        ZonCloudDicomSlice& slice = _slices[s];
+        if (slice.pixels.empty()) return;
+        ZonCloudSampler keep = starts[s].sampler;
         // One grey per possible stored value, so the pixels below need no arithmetic of their own.
         std::int32_t least = INT32_MAX, greatest = INT32_MIN;
         for (std::size_t i = 0; i < slice.pixels.size(); ++i) {
             least = std::min(least, slice.Raw(i));
             greatest = std::max(greatest, slice.Raw(i));
         }
+        std::vector<unsigned char> greys(65536);
         if (slice.pixels.size() >= greys.size()) {
             for (std::size_t bits = 0; bits < greys.size(); ++bits) {
                 const auto raw = slice.pixelSigned ? static_cast<std::int32_t>(static_cast<std::int16_t>(bits))
@@ -164,29 +180,38 @@ void ZonCloudReadDicom::BuildCloud()
         const double* down = slice.orientation + 3;  // row index grows this way
         const double columnStep[3] = {along[0] * slice.spacing[1], along[1] * slice.spacing[1],
                                       along[2] * slice.spacing[1]};
+        float lo[3] = {INFINITY, INFINITY, INFINITY}, hi[3] = {-INFINITY, -INFINITY, -INFINITY};
+        const std::size_t first = static_cast<std::size_t>(starts[s].point);
+        float* point = _points.data() + 3 * first;
+        unsigned char* colour = _colors.data() + 3 * first;
+        std::int32_t* density = _densities.data() + first;
         std::size_t i = 0;
         for (std::uint32_t row = 0; row < slice.rows; ++row) {
             const double rowStart[3] = {slice.position[0] + row * slice.spacing[0] * down[0],
                                         slice.position[1] + row * slice.spacing[0] * down[1],
                                         slice.position[2] + row * slice.spacing[0] * down[2]};
             for (std::uint32_t column = 0; column < slice.columns; ++column, ++i) {
-                if (!sampler.Keep()) continue;
+                if (!keep.Keep()) continue;
                 for (int k = 0; k < 3; ++k) {
                     const float v = ToFloat(rowStart[k] + column * columnStep[k]);
-                    low[k] = std::min(low[k], v);
-                    high[k] = std::max(high[k], v);
-                    _points.push_back(v);
+                    lo[k] = std::min(lo[k], v);
+                    hi[k] = std::max(hi[k], v);
+                    *point++ = v;
                 }
                 const unsigned char grey = greys[slice.pixels[i]];
-                _colors.push_back(grey);
-                _colors.push_back(grey);
-                _colors.push_back(grey);
-                _densities.push_back(slice.Raw(i));
+                colour[0] = colour[1] = colour[2] = grey;
+                colour += 3;
+                *density++ = slice.Raw(i);
             }
         }
-        // The pixels are now points: their memory goes before the next slice's grows.
+        // The pixels are now points.
         std::vector<std::uint16_t>().swap(slice.pixels);
-    }
+        std::lock_guard lock(mutex);
+        for (int k = 0; k < 3; ++k) {
+            low[k] = std::min(low[k], lo[k]);
+            high[k] = std::max(high[k], hi[k]);
+        }
+    });
     _numberOfPoints = static_cast<int>(_densities.size());
     _boundingBox.SetLowHigh(ZonMathPoint(low[0], low[1], low[2]), ZonMathPoint(high[0], high[1], high[2]));
     _slices.clear();
