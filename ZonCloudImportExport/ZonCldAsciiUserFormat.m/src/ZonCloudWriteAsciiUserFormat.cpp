@@ -32,6 +32,17 @@ std::string EscapePercent(const std::string& text)
     return escaped;
 }
 
+std::string WithCrLf(const std::string& text)
+{
+    std::string out;
+    out.reserve(text.size() + 8);
+    for (const char c : text) {
+        if (c == '\n') out += '\r';
+        out += c;
+    }
+    return out;
+}
+
 }  // namespace
 
 ZonCloudWriteAsciiUserFormat::ZonCloudWriteAsciiUserFormat(const ZonUnicodeString& fileName)
@@ -110,12 +121,7 @@ std::string ZonCloudWriteAsciiUserFormat::LineTemplate(bool withColor) const
 
 void ZonCloudWriteAsciiUserFormat::Emit(const std::string& text)
 {
-    std::string out;
-    out.reserve(text.size() + 8);
-    for (const char c : text) {
-        if (c == '\n') out += '\r';
-        out += c;
-    }
+    const std::string out = WithCrLf(text);
     _file.Write(out.data(), out.size());
 }
 
@@ -142,11 +148,15 @@ void ZonCloudWriteAsciiUserFormat::PrepareLines()
 {
     _templatePlain = LineTemplate(false);
     _templateColor = LineTemplate(true);
+    _linePlain = ZonCloudLineFormat(_templatePlain);
+    _linePlain.UseCrLf();
+    _lineColor = ZonCloudLineFormat(_templateColor);
+    _lineColor.UseCrLf();
     // Doubled, as one line: the copy's "!" becomes a separator character.
     const std::string line = RowSeparatorLine();
     std::string copy = line;
     if (copy.size() > 2) copy[0] = copy[2];
-    _pointSeparator = line + copy + "\n";
+    _pointSeparator = WithCrLf(line + copy + "\n");
 }
 
 void ZonCloudWriteAsciiUserFormat::BeginWritePoints(const unsigned& count)
@@ -160,25 +170,46 @@ void ZonCloudWriteAsciiUserFormat::BeginWritePoints(const unsigned& count)
     _expected = count;
 }
 
-void ZonCloudWriteAsciiUserFormat::WritePointLine(double x, double y, double z, const unsigned char* rgb)
+std::uint64_t ZonCloudWriteAsciiUserFormat::TakeLines(std::uint64_t lines)
 {
-    if (!_file.IsOpen() || _expected == 0) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_Failure");
-    if (_rowSeparatorGiven) Emit(_pointSeparator);
-    const std::string& format = rgb ? _templateColor : _templatePlain;
-    const int number = static_cast<int>(_total - _expected + 1);
-    std::string text;
-    if (_pointNumber && rgb)
-        ZonPrint(text, format.c_str(), number, x, y, z, int{rgb[0]}, int{rgb[1]}, int{rgb[2]});
-    else if (_pointNumber)
-        ZonPrint(text, format.c_str(), number, x, y, z);
-    else if (rgb)
-        ZonPrint(text, format.c_str(), x, y, z, int{rgb[0]}, int{rgb[1]}, int{rgb[2]});
-    else
-        ZonPrint(text, format.c_str(), x, y, z);
-    Emit(text);
-    --_expected;
+    if (!_file.IsOpen() || _expected < lines) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_Failure");
+    const std::uint64_t first = _total - _expected + 1;
+    _expected -= lines;
+    return first;
 }
 
+void ZonCloudWriteAsciiUserFormat::FormatLine(ZonCloudTextBuffer& out, const double xyz[3], const unsigned char* rgb,
+                                              std::uint64_t number) const
+{
+    if (_rowSeparatorGiven) out.Append(_pointSeparator.data(), _pointSeparator.size());
+    // The number column is an int, as it always was.
+    const double label = static_cast<int>(number);
+    double values[7];
+    double* v = values;
+    if (_pointNumber) *v++ = label;
+    for (int k = 0; k < 3; ++k) *v++ = xyz[k];
+    if (rgb)
+        for (int k = 0; k < 3; ++k) *v++ = rgb[k];
+    const ZonCloudLineFormat& line = rgb ? _lineColor : _linePlain;
+    if (line.IsValid()) {
+        out.Commit(line.Print(out.Reserve(line.Bound()), values));
+        return;
+    }
+    // Widths or precisions beyond the printer's: the C library prints them.
+    const std::string& format = rgb ? _templateColor : _templatePlain;
+    std::string text;
+    const int n = static_cast<int>(number);
+    if (_pointNumber && rgb)
+        ZonPrint(text, format.c_str(), n, xyz[0], xyz[1], xyz[2], int{rgb[0]}, int{rgb[1]}, int{rgb[2]});
+    else if (_pointNumber)
+        ZonPrint(text, format.c_str(), n, xyz[0], xyz[1], xyz[2]);
+    else if (rgb)
+        ZonPrint(text, format.c_str(), xyz[0], xyz[1], xyz[2], int{rgb[0]}, int{rgb[1]}, int{rgb[2]});
+    else
+        ZonPrint(text, format.c_str(), xyz[0], xyz[1], xyz[2]);
+    text = WithCrLf(text);
+    out.Append(text.data(), text.size());
+}
 
 void ZonCloudWriteAsciiUserFormat::EndWritePoints()
 {

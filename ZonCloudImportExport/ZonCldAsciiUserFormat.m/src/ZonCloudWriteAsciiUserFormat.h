@@ -2,6 +2,7 @@
 #include <cstdint>
 #include <string>
 
+#include "ZonCloudLineFormat.h"
 #include "ZonCloudWritePointLines.h"
 
 // Writes points as fixed-width text columns for the ASCII user format: an
@@ -45,7 +46,10 @@ public:
     std::string RowSeparatorLine() const;
 
 protected:
-    void WritePointLine(double x, double y, double z, const unsigned char* rgb) override;
+    // The first line's number is its place in the file, from 1.
+    std::uint64_t TakeLines(std::uint64_t lines) override;
+    void FormatLine(ZonCloudTextBuffer& out, const double xyz[3], const unsigned char* rgb,
+                    std::uint64_t number) const override;
 
 private:
     void WriteHeader();
@@ -68,7 +72,10 @@ private:
 
     std::string _templatePlain;
     std::string _templateColor;
-    std::string _pointSeparator;
+    // The same with CR LF line ends, decoded once.
+    ZonCloudLineFormat _linePlain;
+    ZonCloudLineFormat _lineColor;
+    std::string _pointSeparator;  // with CR LF line ends
 
     std::uint64_t _total = 0;     // points announced
     std::uint64_t _expected = 0;  // points still to come

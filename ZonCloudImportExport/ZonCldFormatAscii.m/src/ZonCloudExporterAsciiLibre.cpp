@@ -23,15 +23,22 @@ bool IsValid(const std::vector<unsigned char>* valid, std::size_t i)
     return !valid || (i < valid->size() && (*valid)[i]);
 }
 
+// The whole array in one call, so that a large one is formatted on the worker pool.
 void WritePoints(ZonCloudWriteAsciiLibre& writer, const ZonCldPointArray& points,
                  const std::vector<unsigned char>* valid = nullptr)
 {
-    const std::size_t n = points.GetNumberOfPoints();
-    for (std::size_t i = 0; i < n; ++i) {
-        if (!IsValid(valid, i)) continue;
-        if (points.IsDoublePrecision()) writer.WritePointDouble(points.GetDoubles().data() + 3 * i);
-        else writer.WritePoint(points.GetFloats().data() + 3 * i);
+    ZonCloudWriteAsciiLibre::Run run;
+    run.count = points.GetNumberOfPoints();
+    if (run.count == 0) return;
+    if (points.IsDoublePrecision()) run.dual = points.GetDoubles().data();
+    else run.single = points.GetFloats().data();
+    std::vector<unsigned char> padded;
+    if (valid) {
+        padded.resize(run.count);
+        for (std::size_t i = 0; i < run.count; ++i) padded[i] = IsValid(valid, i) ? 1 : 0;
+        run.valid = padded.data();
     }
+    writer.WritePoints(run);
 }
 
 std::size_t ValidPoints(const ZonCldGrid::Row& row)

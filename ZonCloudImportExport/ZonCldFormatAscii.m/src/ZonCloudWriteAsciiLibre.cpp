@@ -1,10 +1,14 @@
 #include "ZonCloudWriteAsciiLibre.h"
 
+#include <type_traits>
+
+#include "ZonCloudLineFormat.h"
 #include "ZonCloudReadNLSTool.h"
 
 namespace {
 // The total of a multi-part file is filled into this many blank columns.
 constexpr int TotalWidth = 12;
+const ZonCloudLineFormat PointLine("X %f Y %f Z %f\n");
 }  // namespace
 
 ZonCloudWriteAsciiLibre::ZonCloudWriteAsciiLibre(const ZonUnicodeString& fileName) : ZonCloudWritePointLines(fileName) {}
@@ -37,19 +41,18 @@ void ZonCloudWriteAsciiLibre::BeginWritePoints(const unsigned& count)
     _expected = count;
 }
 
-void ZonCloudWriteAsciiLibre::CheckPointExpected()
+std::uint64_t ZonCloudWriteAsciiLibre::TakeLines(std::uint64_t lines)
 {
-    if (_expected == 0 || _kind != KindPoints || !_file.IsOpen())
+    if (_expected < lines || _kind != KindPoints || !_file.IsOpen())
         ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_Failure");
+    _expected -= static_cast<std::uint32_t>(lines);
+    return 0;
 }
 
-void ZonCloudWriteAsciiLibre::PointLine(double x, double y, double z) { Print("X %f Y %f Z %f\n", x, y, z); }
-
-void ZonCloudWriteAsciiLibre::WritePointLine(double x, double y, double z, const unsigned char*)
+void ZonCloudWriteAsciiLibre::FormatLine(ZonCloudTextBuffer& out, const double xyz[3], const unsigned char*,
+                                         std::uint64_t) const
 {
-    CheckPointExpected();
-    PointLine(x, y, z);
-    --_expected;
+    out.Commit(PointLine.Print(out.Reserve(PointLine.Bound()), xyz));
 }
 
 void ZonCloudWriteAsciiLibre::End(Kind kind)
@@ -94,7 +97,11 @@ void ZonCloudWriteAsciiLibre::ScanBlock(const T* points, unsigned count)
     if (count > 0 && !points) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_Failure");
     ++_scanCounter;
     Print("G08(%d)\n", static_cast<int>(_scanCounter));
-    for (unsigned i = 0; i < count; ++i) PointLine(points[3 * i], points[3 * i + 1], points[3 * i + 2]);
+    Run run;
+    if constexpr (std::is_same_v<T, float>) run.single = points;
+    else run.dual = points;
+    run.count = count;
+    WriteLines(run, 0);
     Print("G09\n");
     if (_multiWrite) _total += count;
     --_expected;

@@ -28,16 +28,16 @@ public:
     void EndWriteScans() override;
 
 protected:
+    std::uint64_t TakeLines(std::uint64_t lines) override;
     // The format has no colours: the point alone is written.
-    void WritePointLine(double x, double y, double z, const unsigned char* rgb) override;
+    void FormatLine(ZonCloudTextBuffer& out, const double xyz[3], const unsigned char* rgb,
+                    std::uint64_t number) const override;
 
 private:
     enum Kind : std::int32_t { KindNone = 0, KindPoints = 1, KindScans = 2 };
 
     void WriteHeaderStart();
-    void CheckPointExpected();
     void CheckScanExpected();
-    void PointLine(double x, double y, double z);
     template <class T>
     void ScanBlock(const T* points, unsigned count);
     void End(Kind kind);

@@ -1,8 +1,10 @@
 #include "ZonCloudWriteCgoAscii.h"
 
+#include "ZonCloudLineFormat.h"
 #include "ZonCloudReadNLSTool.h"
 
 namespace {
+const ZonCloudLineFormat PointLine("%f %f %f\n");
 // The count line of a multi-part file before its total is known.
 constexpr const char* Placeholder = "            \n";
 }
@@ -45,11 +47,17 @@ void ZonCloudWriteCgoAscii::BeginWritePoints(const unsigned& count)
     _expected = count;
 }
 
-void ZonCloudWriteCgoAscii::WritePointLine(double x, double y, double z, const unsigned char*)
+std::uint64_t ZonCloudWriteCgoAscii::TakeLines(std::uint64_t lines)
 {
-    if (!_file.IsOpen() || _expected == 0) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_Failure");
-    Print("%f %f %f\n", x, y, z);
-    --_expected;
+    if (!_file.IsOpen() || _expected < lines) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_Failure");
+    _expected -= lines;
+    return 0;
+}
+
+void ZonCloudWriteCgoAscii::FormatLine(ZonCloudTextBuffer& out, const double xyz[3], const unsigned char*,
+                                       std::uint64_t) const
+{
+    out.Commit(PointLine.Print(out.Reserve(PointLine.Bound()), xyz));
 }
 
 void ZonCloudWriteCgoAscii::EndWritePoints()

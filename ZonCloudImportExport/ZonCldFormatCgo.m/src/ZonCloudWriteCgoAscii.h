@@ -21,7 +21,9 @@ public:
 
 protected:
     // The format has no colours: the point alone is written.
-    void WritePointLine(double x, double y, double z, const unsigned char* rgb) override;
+    std::uint64_t TakeLines(std::uint64_t lines) override;
+    void FormatLine(ZonCloudTextBuffer& out, const double xyz[3], const unsigned char* rgb,
+                    std::uint64_t number) const override;
 
 private:
     std::uint64_t _expected = 0;  // points still to come

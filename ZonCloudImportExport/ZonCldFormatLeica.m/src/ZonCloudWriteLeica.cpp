@@ -1,9 +1,11 @@
 #include "ZonCloudWriteLeica.h"
 
+#include "ZonCloudLineFormat.h"
 #include "ZonCloudReadNLSTool.h"
 
 namespace {
 const unsigned char White[3] = {255, 255, 255};
+const ZonCloudLineFormat PointLine("%f %f %f %d %d %d\n");
 }
 
 ZonCloudWriteLeica::ZonCloudWriteLeica(const ZonUnicodeString& fileName) : ZonCloudWritePointLines(fileName) {}
@@ -19,12 +21,20 @@ void ZonCloudWriteLeica::BeginWritePoints(const unsigned& count)
     _expected = count;
 }
 
-void ZonCloudWriteLeica::WritePointLine(double x, double y, double z, const unsigned char* rgb)
+std::uint64_t ZonCloudWriteLeica::TakeLines(std::uint64_t lines)
+{
+    if (!_file.IsOpen() || _expected < lines) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_Failure");
+    _expected -= lines;
+    return 0;
+}
+
+void ZonCloudWriteLeica::FormatLine(ZonCloudTextBuffer& out, const double xyz[3], const unsigned char* rgb,
+                                    std::uint64_t) const
 {
     if (!rgb) rgb = White;
-    if (!_file.IsOpen() || _expected == 0) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_Failure");
-    Print("%f %f %f %d %d %d\n", x, y, z, rgb[0], rgb[1], rgb[2]);
-    --_expected;
+    const double values[6] = {xyz[0], xyz[1], xyz[2], static_cast<double>(rgb[0]), static_cast<double>(rgb[1]),
+                              static_cast<double>(rgb[2])};
+    out.Commit(PointLine.Print(out.Reserve(PointLine.Bound()), values));
 }
 
 void ZonCloudWriteLeica::EndWritePoints()

@@ -1,10 +1,14 @@
 #include "ZonCloudPrintFormat.h"
 
 #include <clocale>
+#include <limits>
 #include <cstddef>
 #include <cstdint>
 #include <cstring>
+#include <type_traits>
 #include <sys/types.h>
+
+#include "ZonCloudNumberPrinter.h"
 
 namespace {
 
@@ -77,6 +81,44 @@ bool EmitUnsigned(std::string& out, const char* directive, std::va_list& args, L
     }
 }
 
+// Appends a number through the module's printer.
+template <class T>
+void AppendNumber(std::string& out, const ZonNumberSpec& spec, T value)
+{
+    const std::size_t start = out.size();
+    out.resize(start + ZonCloudNumberPrinter::Bound(spec));
+    char* end = ZonCloudNumberPrinter::Print(out.data() + start, spec, value);
+    out.resize(static_cast<std::size_t>(end - out.data()));
+}
+
+long long SignedArgument(std::va_list& args, Length length)
+{
+    switch (length) {
+        case Length::Char: return static_cast<signed char>(va_arg(args, int));
+        case Length::Short: return static_cast<short>(va_arg(args, int));
+        case Length::Long: return va_arg(args, long);
+        case Length::LongLong: return va_arg(args, long long);
+        case Length::IntMax: return va_arg(args, std::intmax_t);
+        case Length::Size: return va_arg(args, ssize_t);
+        case Length::PtrDiff: return va_arg(args, std::ptrdiff_t);
+        default: return va_arg(args, int);
+    }
+}
+
+unsigned long long UnsignedArgument(std::va_list& args, Length length)
+{
+    switch (length) {
+        case Length::Char: return static_cast<unsigned char>(va_arg(args, unsigned));
+        case Length::Short: return static_cast<unsigned short>(va_arg(args, unsigned));
+        case Length::Long: return va_arg(args, unsigned long);
+        case Length::LongLong: return va_arg(args, unsigned long long);
+        case Length::IntMax: return va_arg(args, std::uintmax_t);
+        case Length::Size: return va_arg(args, std::size_t);
+        case Length::PtrDiff: return static_cast<std::make_unsigned_t<std::ptrdiff_t>>(va_arg(args, std::ptrdiff_t));
+        default: return va_arg(args, unsigned);
+    }
+}
+
 // Appends the directive's decimal number to the rebuilt directive.
 void AppendNumber(std::string& directive, long value)
 {
@@ -111,17 +153,37 @@ int ZonPrintV(std::string& out, const char* format, std::va_list arguments)
         }
         // Rebuild the directive for one snprintf call, with '*' resolved and
         // the grouping flags dropped.
+        // The same directive is decoded for the module's number printer.
         directive.assign("%");
+        ZonNumberSpec spec;
+        bool specValid = true;
         while (*p && std::strchr("-+ #0'I", *p)) {
             if (*p != '\'' && *p != 'I') directive += *p;
+            spec.left |= *p == '-';
+            spec.plus |= *p == '+';
+            spec.space |= *p == ' ';
+            spec.alt |= *p == '#';
+            spec.zero |= *p == '0';
             ++p;
         }
+        const auto readNumber = [&](int& value) {
+            value = 0;
+            for (; *p >= '0' && *p <= '9'; ++p) {
+                directive += *p;
+                if (value > 100'000'000) specValid = false;
+                else value = value * 10 + (*p - '0');
+            }
+        };
         if (*p == '*') {
             const int width = va_arg(args, int);
             AppendNumber(directive, width);
+            // A negative width left-aligns, as in printf.
+            if (width < 0) spec.left = true;
+            if (width == std::numeric_limits<int>::min()) specValid = false;
+            else spec.width = width < 0 ? -width : width;
             ++p;
         } else {
-            while (*p >= '0' && *p <= '9') directive += *p++;
+            readNumber(spec.width);
         }
         if (*p == '.') {
             directive += *p++;
@@ -130,9 +192,10 @@ int ZonPrintV(std::string& out, const char* format, std::va_list arguments)
                 // A negative precision counts as none, as in printf.
                 if (precision >= 0) AppendNumber(directive, precision);
                 else directive.pop_back();
+                spec.precision = precision < 0 ? -1 : precision;
                 ++p;
             } else {
-                while (*p >= '0' && *p <= '9') directive += *p++;
+                readNumber(spec.precision);
             }
         }
         Length length = Length::None;
@@ -150,7 +213,22 @@ int ZonPrintV(std::string& out, const char* format, std::va_list arguments)
         directive.append(lengthStart, static_cast<std::size_t>(p - lengthStart));
         const char conversion = *p;
         bool done = false;
-        if (conversion) {
+        spec.conversion = conversion;
+        const bool fast = specValid && ZonCloudNumberPrinter::Handles(spec);
+        if (conversion && fast && (conversion == 'd' || conversion == 'i') && length != Length::LongDouble) {
+            AppendNumber(out, spec, SignedArgument(args, length));
+            done = true;
+            ++p;
+        } else if (conversion && fast && conversion == 'u' && length != Length::LongDouble) {
+            AppendNumber(out, spec, UnsignedArgument(args, length));
+            done = true;
+            ++p;
+        } else if (conversion && fast && conversion != 'd' && conversion != 'i' && conversion != 'u' &&
+                   (length == Length::None || length == Length::Long)) {
+            AppendNumber(out, spec, va_arg(args, double));
+            done = true;
+            ++p;
+        } else if (conversion) {
             directive += conversion;
             switch (conversion) {
                 case 'd':
