@@ -14,8 +14,9 @@ void ZonCloudBlockWriter::Write(ZonCloudOutputFile& file, std::size_t count, std
         text.Clear();
         format(text, block * perBlock, std::min(count, (block + 1) * perBlock));
     };
-    const unsigned threads = ZonCloudWorkerPool::ThreadCount();
-    if (blocks == 1 || threads <= 1) {
+    // Asking for the thread count costs a system call: a single line must not.
+    const unsigned threads = blocks == 1 ? 1 : ZonCloudWorkerPool::ThreadCount();
+    if (threads <= 1) {
         // A line at a time is the common small case: no allocation per call.
         thread_local ZonCloudTextBuffer text;
         for (std::size_t block = 0; block < blocks; ++block) {
