@@ -8,6 +8,7 @@
 #include <cstdio>
 
 #include "ZonCloudExportOutcome.h"
+#include "ZonCloudNumberPrinter.h"
 #include "ZonCloudPrintFormat.h"
 #include "ZonCloudReadNLSTool.h"
 #include "ZonCloudScanFormat.h"
@@ -66,13 +67,11 @@ std::string Escaped(const std::string& text)
     return out;
 }
 
-// "%f" of the value: to_chars with a precision prints as printf does, with '.' always.
+// "%f" of the value, as printf prints it under "C".
 void AppendFixed(std::string& out, double value)
 {
     char text[400];
-    const auto [end, error] = std::to_chars(text, text + sizeof text, value, std::chars_format::fixed, 6);
-    if (error == std::errc()) out.append(text, end);
-    else ZonPrint(out, "%f", value);
+    out.append(text, ZonCloudNumberPrinter::Fixed(text, value, 6));
 }
 
 void AppendNumber(std::string& out, std::uint64_t value)

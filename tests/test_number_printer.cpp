@@ -11,6 +11,8 @@
 #include <string>
 #include <vector>
 
+#include "ZonCldSTLBinaryFormat.h"
+#include "ZonCldSTLOutputDocument.h"
 #include "ZonCloudLineFormat.h"
 #include "ZonCloudNumberPrinter.h"
 #include "ZonCloudPrintFormat.h"
@@ -18,6 +20,11 @@
 #include "ZonCloudWriteAsciiLibre.h"
 #include "ZonCloudWriteAsciiUserFormat.h"
 #include "ZonCloudWriteLeica.h"
+#include "ZonExchMemoryDocument.h"
+#include "ZonExchMemoryTessFace.h"
+#include "ZonExchMemoryTessNode.h"
+#include "ZonExchMemoryTessRep.h"
+#include "ZonIReporter.h"
 #include "ZonTestFiles.h"
 
 namespace {
@@ -293,6 +300,57 @@ TEST_F(BlockWriting, UserFormatLinesAndNumbersAreThoseOfPointsWrittenOneByOne)
     EXPECT_NE(expected.find(ZonFormat("\r\n %12d | ", static_cast<int>(kept + n))), std::string::npos);
     ZonCloudWorkerPool::SetThreadCount(3);
     EXPECT_EQ(write(Path("whole.asc_fmt"), true), expected);
+}
+
+// Output documents gather their records and write them in blocks: a text
+// STL file of two documents is the C library's facets in order whatever the
+// threads.
+TEST_F(BlockWriting, TextStlFacetsAreTheCLibrarysWhateverTheThreads)
+{
+    ZonSession::GetPtrSession()->SetReporter(std::make_shared<ZonCollectingReporter>());
+    constexpr unsigned kTriangles = 40'000;
+    std::mt19937 random(3);
+    std::uniform_real_distribution<float> coordinate(1.0f, 1000.0f);
+    std::vector<float> coords(9 * kTriangles);
+    for (float& v : coords) v = coordinate(random);
+    std::vector<unsigned> offsets(3 * kTriangles);
+    for (unsigned i = 0; i < offsets.size(); ++i) offsets[i] = 3 * i;
+    auto face = std::make_shared<ZonExchMemoryTessFace>();
+    face->SetCoords(coords);
+    face->SetTriangles(offsets);
+    auto node = std::make_shared<ZonExchMemoryTessNode>(ZonExchNodeSolid);
+    node->AddFace(face);
+    auto rep = std::make_shared<ZonExchMemoryTessRep>();
+    rep->AddTopNode(node);
+    auto document = std::make_shared<ZonExchMemoryDocument>("grid");
+    document->SetRepresentation(ZonIExchTessRep::RepresentationType, rep);
+
+    std::string facets;
+    char text[2048];
+    for (unsigned t = 0; t < kTriangles; ++t) {
+        double v[9], n[3];
+        for (int k = 0; k < 9; ++k) v[k] = coords[9 * t + static_cast<unsigned>(k)];
+        ZonCldSTLBinaryFormat::Normal(v, n);
+        const int size = std::snprintf(text, sizeof text,
+                                       "  facet normal %e %e %e\n    outer loop\n      vertex %e %e %e\n"
+                                       "      vertex %e %e %e\n      vertex %e %e %e\n    endloop\n  endfacet\n",
+                                       n[0], n[1], n[2], v[0], v[1], v[2], v[3], v[4], v[5], v[6], v[7], v[8]);
+        facets.append(text, static_cast<std::size_t>(size));
+    }
+    const std::string expected = "solid grid \n" + facets + "solid grid \n" + facets + "endsolid\n";
+    for (const unsigned threads : {1u, 3u}) {
+        ZonCloudWorkerPool::SetThreadCount(threads);
+        const std::string path = Path("text.stl");
+        ZonCldSTLOutputDocument output;
+        output.SetFileName(path);
+        output.SetOptions({"BinaryState"}, {"0"});
+        ASSERT_EQ(output.Open(), ZON_S_OK);
+        EXPECT_EQ(output.Write(document), ZON_S_OK);
+        EXPECT_EQ(output.Write(document), ZON_S_OK);
+        output.Close();
+        output.Release();
+        EXPECT_TRUE(zontest::Slurp(path) == expected) << threads << " threads";
+    }
 }
 
 }  // namespace

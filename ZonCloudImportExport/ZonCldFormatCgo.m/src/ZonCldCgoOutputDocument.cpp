@@ -1,8 +1,10 @@
 #include "ZonCldCgoOutputDocument.h"
 
+#include "ZonCloudLineFormat.h"
 #include "ZonObjectRegistry.h"
 
 namespace {
+const ZonCloudLineFormat PointLine("%f %f %f\n");
 const ZonRegistration Registration("CLD_Cgo_OutputDocument", ZonIExchOutputDocument::InterfaceName,
                                    [] { return std::make_shared<ZonCldCgoOutputDocument>(); });
 }
@@ -11,20 +13,16 @@ void ZonCldCgoOutputDocument::BeginFile()
 {
     // The count goes here on closing, when it is known.
     _output.Print("            \n");
-    _count = 0;
 }
 
-void ZonCldCgoOutputDocument::WritePoint(double x, double y, double z, const unsigned char*)
+void ZonCldCgoOutputDocument::FormatPoint(ZonCloudTextBuffer& out, const double xyz[3], const unsigned char*) const
 {
-    _output.Print("%f %f %f\n", x, y, z);
-    ++_count;
+    out.Commit(PointLine.Print(out.Reserve(PointLine.Bound()), xyz));
 }
 
 void ZonCldCgoOutputDocument::EndFile()
 {
-    const std::uint64_t count = _count;
-    _count = 0;
     _output.Print("**end cloud**\n");
     _output.Seek(0, SEEK_SET);
-    _output.Print("%-12d", static_cast<int>(count));
+    _output.Print("%-12d", static_cast<int>(PointsInFile()));
 }

@@ -11,9 +11,6 @@
 class ZON_CLD_API ZonCldCgoOutputDocument : public ZonCldPointOutputDocument {
 protected:
     void BeginFile() override;
-    void WritePoint(double x, double y, double z, const unsigned char* rgb) override;
+    void FormatPoint(ZonCloudTextBuffer& out, const double xyz[3], const unsigned char* rgb) const override;
     void EndFile() override;
-
-private:
-    std::uint64_t _count = 0;  // points of the file being written
 };

@@ -7,5 +7,5 @@
 // colour, "x y z R G B " with the point's own colour or its representation's one.
 class ZON_CLD_API ZonCldLeicaOutputDocument : public ZonCldPointOutputDocument {
 protected:
-    void WritePoint(double x, double y, double z, const unsigned char* rgb) override;
+    void FormatPoint(ZonCloudTextBuffer& out, const double xyz[3], const unsigned char* rgb) const override;
 };

@@ -1,7 +1,10 @@
 #include "ZonCldSTLOutputDocument.h"
 
+#include <algorithm>
+
 #include "ZonCldSTLBinaryFormat.h"
 #include "ZonCloudExportOutcome.h"
+#include "ZonCloudLineFormat.h"
 #include "ZonCloudPrintFormat.h"
 #include "ZonCloudReadNLSTool.h"
 #include "ZonCloudScanFormat.h"
@@ -35,7 +38,22 @@ std::string ExpandAlias(const std::string& alias)
 
 [[noreturn]] void RaiseInput(const char* code) { ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Input, code); }
 
+const ZonCloudLineFormat Facet("  facet normal %e %e %e\n"
+                               "    outer loop\n"
+                               "      vertex %e %e %e\n"
+                               "      vertex %e %e %e\n"
+                               "      vertex %e %e %e\n"
+                               "    endloop\n"
+                               "  endfacet\n");
+
 }  // namespace
+
+ZonCldSTLOutputDocument::ZonCldSTLOutputDocument()
+    : _facets(12, [](ZonCloudTextBuffer& out, const double* facet) {
+          out.Commit(Facet.Print(out.Reserve(Facet.Bound()), facet));
+      })
+{
+}
 
 ZonHResult ZonCldSTLOutputDocument::SetFileName(const ZonUnicodeString& fileName)
 {
@@ -64,6 +82,7 @@ ZonHResult ZonCldSTLOutputDocument::SetOptions(const ZonListValZonString& names,
 ZonHResult ZonCldSTLOutputDocument::Open()
 {
     // Binary files are opened for update: each face rewrites the count.
+    _facets.Discard();
     if (!_output.Open(_fileName, _binary ? "w+b" : "wt")) return ZON_E_FAIL;
     _headerPending = _binary;
     return ZON_S_OK;
@@ -74,6 +93,7 @@ ZonHResult ZonCldSTLOutputDocument::Write(const ZonIExchInputDocument_var& docum
     if (!document) return ZON_E_FAIL;
     if (!_binary) {
         if (!_output.IsOpen()) RaiseInput("No File");
+        _facets.Flush(_output);
         _output.Print("solid %s \n", ExpandAlias(document->GetAliasName().ToUtf8()).c_str());
     }
     if (document->HasRepresentation(ZonIExchProductStructure::RepresentationType)) {
@@ -266,18 +286,18 @@ void ZonCldSTLOutputDocument::WriteFacet(const ZonMathPoint& a, const ZonMathPoi
         ZonCldSTLBinaryFormat::WriteFacet(_output, n, v, _reverseBytes);
         return;
     }
-    _output.Print("  facet normal %e %e %e\n", normal[0], normal[1], normal[2]);
-    _output.Print("    outer loop\n");
-    for (int i = 0; i < 3; ++i)
-        _output.Print("      vertex %e %e %e\n", vertices[3 * i], vertices[3 * i + 1], vertices[3 * i + 2]);
-    _output.Print("    endloop\n");
-    _output.Print("  endfacet\n");
+    double* facet = _facets.Add(_output);
+    std::copy(normal, normal + 3, facet);
+    std::copy(vertices, vertices + 9, facet + 3);
 }
 
 ZonHResult ZonCldSTLOutputDocument::Close()
 {
     if (!_output.IsOpen()) return ZON_S_OK;
-    if (!_binary) _output.Print("endsolid\n");
+    if (!_binary) {
+        _facets.Flush(_output);
+        _output.Print("endsolid\n");
+    }
     _output.Close();
     return ZON_S_OK;
 }

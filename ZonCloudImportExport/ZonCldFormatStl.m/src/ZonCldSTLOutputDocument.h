@@ -4,6 +4,7 @@
 #include "ZonBaseUnknown.h"
 #include "ZonCldExport.h"
 #include "ZonCloudOutputFile.h"
+#include "ZonCloudPendingLines.h"
 #include "ZonIExchOutputDocument.h"
 #include "ZonIExchProduct.h"
 #include "ZonIExchTessRep.h"
@@ -18,7 +19,7 @@
 // fails removes the file and raises the system's error.
 class ZON_CLD_API ZonCldSTLOutputDocument : public ZonBaseUnknown, public ZonIExchOutputDocument {
 public:
-    ZonCldSTLOutputDocument() = default;
+    ZonCldSTLOutputDocument();
     ~ZonCldSTLOutputDocument() override = default;
     ZonCldSTLOutputDocument(const ZonCldSTLOutputDocument&) = delete;
     ZonCldSTLOutputDocument& operator=(const ZonCldSTLOutputDocument&) = delete;
@@ -60,6 +61,8 @@ private:
 
     ZonUnicodeString _fileName;
     ZonCloudOutputFile _output;
+    // Text facets (normal and three vertices) waiting to be formatted.
+    ZonCloudPendingLines _facets;
     bool _binary = true;
     bool _headerPending = true;
     bool _reverseBytes = false;  // never set here; the layout allows it

@@ -24,7 +24,9 @@ ZonHResult ZonCldPointOutputDocument::SetOptions(const ZonListValZonString& name
 
 ZonHResult ZonCldPointOutputDocument::Open()
 {
+    _pending.Discard();
     if (!_output.Open(_fileName, "w")) return ZON_E_FAIL;
+    _inFile = 0;
     BeginFile();
     return ZON_S_OK;
 }
@@ -35,15 +37,22 @@ ZonHResult ZonCldPointOutputDocument::Write(const ZonIExchInputDocument_var& doc
     if (!_output.IsOpen()) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Input, "No File");
     const double scale = _scale != 0.0 ? _scale : 1.0;
     const bool read = ZonExchPointWalker::Walk(*document, _readDouble, [&](const ZonMathPoint& p, const unsigned char* rgb) {
-        WritePoint(p[0] * scale, p[1] * scale, p[2] * scale, rgb);
+        double* record = _pending.Add(_output);
+        for (int k = 0; k < 3; ++k) record[k] = p[k] * scale;
+        record[3] = rgb ? 1 : 0;
+        for (int k = 0; k < 3; ++k) record[4 + k] = rgb ? rgb[k] : 0;
         ++_written;
+        ++_inFile;
     });
     return read ? ZON_S_OK : ZON_E_FAIL;
 }
 
 ZonHResult ZonCldPointOutputDocument::Close()
 {
-    if (_output.IsOpen()) EndFile();
+    if (_output.IsOpen()) {
+        _pending.Flush(_output);
+        EndFile();
+    }
     _output.Close();
     return ZON_S_OK;
 }

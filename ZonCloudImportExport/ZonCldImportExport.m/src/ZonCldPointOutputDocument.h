@@ -4,6 +4,8 @@
 #include "ZonBaseUnknown.h"
 #include "ZonCldExport.h"
 #include "ZonCloudOutputFile.h"
+#include "ZonCloudPendingLines.h"
+#include "ZonCloudTextBuffer.h"
 #include "ZonIExchOutputDocument.h"
 
 // Base of the output documents that write the points of an exchange document
@@ -36,16 +38,27 @@ protected:
 
     // What comes before the points of a new file.
     virtual void BeginFile() {}
-    // One point, placed and scaled; rgb is null for a point without colour.
-    virtual void WritePoint(double x, double y, double z, const unsigned char* rgb) = 0;
-    // What comes after the points, the file still open.
+    // Appends one point's line, placed and scaled; rgb is null for a point
+    // without colour. Lines are formatted in blocks on worker threads: this
+    // only reads the document.
+    virtual void FormatPoint(ZonCloudTextBuffer& out, const double xyz[3], const unsigned char* rgb) const = 0;
+    // What comes after the points, the file still open and every line written.
     virtual void EndFile() {}
+    // Points written into the file being written.
+    std::uint64_t PointsInFile() const { return _inFile; }
 
     ZonCloudOutputFile _output;
 
 private:
+    ZonCloudPendingLines _pending{7, [this](ZonCloudTextBuffer& out, const double* r) {
+                                      const unsigned char rgb[3] = {static_cast<unsigned char>(r[4]),
+                                                                    static_cast<unsigned char>(r[5]),
+                                                                    static_cast<unsigned char>(r[6])};
+                                      FormatPoint(out, r, r[3] != 0 ? rgb : nullptr);
+                                  }};
     ZonUnicodeString _fileName;
     double _scale = 1.0;
     bool _readDouble = false;
     std::uint64_t _written = 0;  // points written since creation
+    std::uint64_t _inFile = 0;   // points written since the file was opened
 };
