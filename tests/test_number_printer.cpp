@@ -29,17 +29,17 @@
 
 namespace {
 
-std::string FormatOf(const ZonNumberSpec& spec, const char* length = "")
+std::string FormatOf(const ZonNumberConversion& conv, const char* length = "")
 {
     std::string format = "%";
-    if (spec.left) format += '-';
-    if (spec.plus) format += '+';
-    if (spec.space) format += ' ';
-    if (spec.zero) format += '0';
-    if (spec.alt) format += '#';
-    if (spec.width) format += std::to_string(spec.width);
-    if (spec.precision >= 0) format += "." + std::to_string(spec.precision);
-    return format + length + spec.conversion;
+    if (conv.left) format += '-';
+    if (conv.plus) format += '+';
+    if (conv.space) format += ' ';
+    if (conv.zero) format += '0';
+    if (conv.alt) format += '#';
+    if (conv.width) format += std::to_string(conv.width);
+    if (conv.precision >= 0) format += "." + std::to_string(conv.precision);
+    return format + length + conv.letter;
 }
 
 // Compares the printer with snprintf (the tests run under the "C" locale)
@@ -47,12 +47,12 @@ std::string FormatOf(const ZonNumberSpec& spec, const char* length = "")
 class Differ {
 public:
     template <class T>
-    void Check(const ZonNumberSpec& spec, const std::string& format, T value)
+    void Check(const ZonNumberConversion& conv, const std::string& format, T value)
     {
         char expected[2048];
         char actual[2048];
         std::snprintf(expected, sizeof expected, format.c_str(), value);
-        *ZonCloudNumberPrinter::Print(actual, spec, value) = '\0';
+        *ZonCloudNumberPrinter::Print(actual, conv, value) = '\0';
         ++checked;
         if (std::strcmp(expected, actual) == 0) return;
         if (mismatches.size() < 10)
@@ -62,10 +62,10 @@ public:
     }
     void Check(char conversion, int precision, double value)
     {
-        ZonNumberSpec spec;
-        spec.conversion = conversion;
-        spec.precision = precision;
-        Check(spec, FormatOf(spec), value);
+        ZonNumberConversion conv;
+        conv.letter = conversion;
+        conv.precision = precision;
+        Check(conv, FormatOf(conv), value);
     }
 
     std::size_t checked = 0;
@@ -103,11 +103,11 @@ TEST(NumberPrinter, EveryFlagWidthAndPrecisionPrintsAsTheCLibrary)
         for (int flags = 0; flags < 32; ++flags)
             for (const int width : {0, 1, 9, 30})
                 for (const int precision : {-1, 0, 1, 3, 6, 17, 19, 20, 40}) {
-                    ZonNumberSpec spec{conversion, (flags & 1) != 0, (flags & 2) != 0, (flags & 4) != 0,
+                    ZonNumberConversion conv{conversion, (flags & 1) != 0, (flags & 2) != 0, (flags & 4) != 0,
                                        (flags & 8) != 0, (flags & 16) != 0, width, precision};
-                    if (!ZonCloudNumberPrinter::Handles(spec)) continue;
-                    const std::string format = FormatOf(spec);
-                    for (const double value : values) differ.Check(spec, format, value);
+                    if (!ZonCloudNumberPrinter::Handles(conv)) continue;
+                    const std::string format = FormatOf(conv);
+                    for (const double value : values) differ.Check(conv, format, value);
                 }
     const long long integers[] = {0, 1, -1, 7, -42, 1234567, std::numeric_limits<int>::max(),
                                   std::numeric_limits<long long>::min(), std::numeric_limits<long long>::max()};
@@ -115,12 +115,12 @@ TEST(NumberPrinter, EveryFlagWidthAndPrecisionPrintsAsTheCLibrary)
         for (int flags = 0; flags < 16; ++flags)
             for (const int width : {0, 1, 12, 25})
                 for (const int precision : {-1, 0, 1, 5, 22}) {
-                    ZonNumberSpec spec{conversion, (flags & 1) != 0, (flags & 2) != 0, (flags & 4) != 0,
+                    ZonNumberConversion conv{conversion, (flags & 1) != 0, (flags & 2) != 0, (flags & 4) != 0,
                                        (flags & 8) != 0, false, width, precision};
-                    const std::string format = FormatOf(spec, "ll");
+                    const std::string format = FormatOf(conv, "ll");
                     for (const long long value : integers) {
-                        if (conversion == 'u') differ.Check(spec, format, static_cast<unsigned long long>(value));
-                        else differ.Check(spec, format, value);
+                        if (conversion == 'u') differ.Check(conv, format, static_cast<unsigned long long>(value));
+                        else differ.Check(conv, format, value);
                     }
                 }
     EXPECT_EQ(differ.failed, 0u) << Report(differ);
@@ -157,10 +157,10 @@ TEST(NumberPrinter, MillionsOfGeneratedValuesPrintAsTheCLibrary)
         differ.Check('e', static_cast<int>(random() % 20), value);
     }
     for (int i = 0; i < 300'000; ++i) {
-        ZonNumberSpec spec;
-        spec.conversion = 'd';
+        ZonNumberConversion conv;
+        conv.letter = 'd';
         const long long value = static_cast<long long>(random()) >> (random() % 64);
-        differ.Check(spec, "%lld", value);
+        differ.Check(conv, "%lld", value);
     }
     EXPECT_EQ(differ.failed, 0u) << Report(differ);
     EXPECT_GT(differ.checked, 4'000'000u);

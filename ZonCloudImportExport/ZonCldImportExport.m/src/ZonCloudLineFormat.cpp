@@ -34,35 +34,35 @@ ZonCloudLineFormat::ZonCloudLineFormat(const std::string& format)
             ++p;
             continue;
         }
-        ZonNumberSpec& spec = piece.spec;
-        spec = ZonNumberSpec();
+        ZonNumberConversion& conv = piece.conv;
+        conv = ZonNumberConversion();
         // The grouping flags mean nothing under "C": ZonPrint drops them too.
         for (; *p && std::strchr("-+ #0'I", *p); ++p) {
-            if (*p == '-') spec.left = true;
-            else if (*p == '+') spec.plus = true;
-            else if (*p == ' ') spec.space = true;
-            else if (*p == '#') spec.alt = true;
-            else if (*p == '0') spec.zero = true;
+            if (*p == '-') conv.left = true;
+            else if (*p == '+') conv.plus = true;
+            else if (*p == ' ') conv.space = true;
+            else if (*p == '#') conv.alt = true;
+            else if (*p == '0') conv.zero = true;
         }
-        if (!ReadNumber(p, spec.width)) return;
+        if (!ReadNumber(p, conv.width)) return;
         if (*p == '.') {
             ++p;
-            if (!ReadNumber(p, spec.precision)) return;
+            if (!ReadNumber(p, conv.precision)) return;
         }
         if (*p == 'l') p += p[1] == 'l' ? 2 : 1;
-        spec.conversion = *p++;
-        if (!ZonCloudNumberPrinter::Handles(spec)) return;
-        switch (spec.conversion) {
+        conv.letter = *p++;
+        if (!ZonCloudNumberPrinter::Handles(conv)) return;
+        switch (conv.letter) {
             case 'd':
             case 'i': piece.kind = Kind::Signed; break;
             case 'u': piece.kind = Kind::Unsigned; break;
             default:
-                const bool plain = !spec.left && !spec.plus && !spec.space && !spec.zero && !spec.alt && spec.width == 0;
-                piece.kind = plain && spec.conversion == 'f' ? Kind::Fixed : Kind::Floating;
-                if (piece.kind == Kind::Fixed && spec.precision < 0) spec.precision = 6;
+                const bool plain = !conv.left && !conv.plus && !conv.space && !conv.zero && !conv.alt && conv.width == 0;
+                piece.kind = plain && conv.letter == 'f' ? Kind::Fixed : Kind::Floating;
+                if (piece.kind == Kind::Fixed && conv.precision < 0) conv.precision = 6;
                 break;
         }
-        _bound += piece.text.size() + ZonCloudNumberPrinter::Bound(spec);
+        _bound += piece.text.size() + ZonCloudNumberPrinter::Bound(conv);
         ++_numbers;
         _pieces.push_back(std::move(piece));
         piece = Piece();
@@ -79,13 +79,13 @@ char* ZonCloudLineFormat::Print(char* out, const double* values) const
         out += piece.text.size();
         switch (piece.kind) {
             case Kind::None: break;
-            case Kind::Fixed: out = ZonCloudNumberPrinter::Fixed(out, *values++, piece.spec.precision); break;
-            case Kind::Floating: out = ZonCloudNumberPrinter::Print(out, piece.spec, *values++); break;
+            case Kind::Fixed: out = ZonCloudNumberPrinter::Fixed(out, *values++, piece.conv.precision); break;
+            case Kind::Floating: out = ZonCloudNumberPrinter::Print(out, piece.conv, *values++); break;
             case Kind::Signed:
-                out = ZonCloudNumberPrinter::Print(out, piece.spec, static_cast<long long>(*values++));
+                out = ZonCloudNumberPrinter::Print(out, piece.conv, static_cast<long long>(*values++));
                 break;
             case Kind::Unsigned:
-                out = ZonCloudNumberPrinter::Print(out, piece.spec, static_cast<unsigned long long>(*values++));
+                out = ZonCloudNumberPrinter::Print(out, piece.conv, static_cast<unsigned long long>(*values++));
                 break;
         }
     }
@@ -102,6 +102,6 @@ void ZonCloudLineFormat::UseCrLf()
             text += c;
         }
         piece.text = std::move(text);
-        _bound += piece.text.size() + (piece.kind == Kind::None ? 0 : ZonCloudNumberPrinter::Bound(piece.spec));
+        _bound += piece.text.size() + (piece.kind == Kind::None ? 0 : ZonCloudNumberPrinter::Bound(piece.conv));
     }
 }

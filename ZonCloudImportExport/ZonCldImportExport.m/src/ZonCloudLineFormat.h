@@ -35,7 +35,7 @@ private:
     enum class Kind { None, Fixed, Floating, Signed, Unsigned };
     struct Piece {
         std::string text;  // literal text before the conversion
-        ZonNumberSpec spec;
+        ZonNumberConversion conv;
         Kind kind = Kind::None;  // None: the text that ends the line
     };
 

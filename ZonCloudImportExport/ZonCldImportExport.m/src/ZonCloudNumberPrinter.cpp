@@ -111,22 +111,22 @@ bool FixedExact(char*& out, double a, int precision)
 bool Uppercase(char conversion) { return conversion == 'F' || conversion == 'E' || conversion == 'G'; }
 
 // The digits of a finite a >= 0 (no sign, no padding).
-char* FloatDigits(char* out, const ZonNumberSpec& spec, double a)
+char* FloatDigits(char* out, const ZonNumberConversion& conv, double a)
 {
-    const int precision = spec.precision < 0 ? 6 : spec.precision;
+    const int precision = conv.precision < 0 ? 6 : conv.precision;
     char* const last = out + NumberRoom + static_cast<std::size_t>(precision);
     char* end = out;
-    switch (spec.conversion) {
+    switch (conv.letter) {
         case 'f':
         case 'F':
             if (precision > 19 || !FixedExact(end, a, precision))
                 end = std::to_chars(out, last, a, std::chars_format::fixed, precision).ptr;
-            if (spec.alt && precision == 0) *end++ = '.';
+            if (conv.alt && precision == 0) *end++ = '.';
             return end;
         case 'e':
         case 'E':
             end = std::to_chars(out, last, a, std::chars_format::scientific, precision).ptr;
-            if (spec.alt && precision == 0) {
+            if (conv.alt && precision == 0) {
                 // "1e+00" becomes "1.e+00".
                 std::memmove(out + 2, out + 1, static_cast<std::size_t>(end - out - 1));
                 out[1] = '.';
@@ -137,54 +137,54 @@ char* FloatDigits(char* out, const ZonNumberSpec& spec, double a)
             end = std::to_chars(out, last, a, std::chars_format::general, std::max(precision, 1)).ptr;
             break;
     }
-    if (Uppercase(spec.conversion))
+    if (Uppercase(conv.letter))
         for (char* p = out; p != end; ++p)
             if (*p == 'e') *p = 'E';
     return end;
 }
 
 // The field: sign, then `zeros` zeros, then the body, padded to the width.
-char* Field(char* out, const ZonNumberSpec& spec, char sign, bool zeroPadding, int zeros, const char* body,
+char* Field(char* out, const ZonNumberConversion& conv, char sign, bool zeroPadding, int zeros, const char* body,
             std::size_t size)
 {
     const int length = (sign ? 1 : 0) + zeros + static_cast<int>(size);
-    const int padding = spec.width > length ? spec.width - length : 0;
-    if (!spec.left && !zeroPadding && padding > 0) {
+    const int padding = conv.width > length ? conv.width - length : 0;
+    if (!conv.left && !zeroPadding && padding > 0) {
         std::memset(out, ' ', static_cast<std::size_t>(padding));
         out += padding;
     }
     if (sign) *out++ = sign;
-    if (!spec.left && zeroPadding) zeros += padding;
+    if (!conv.left && zeroPadding) zeros += padding;
     if (zeros > 0) {
         std::memset(out, '0', static_cast<std::size_t>(zeros));
         out += zeros;
     }
     std::memcpy(out, body, size);
     out += size;
-    if (spec.left && padding > 0) {
+    if (conv.left && padding > 0) {
         std::memset(out, ' ', static_cast<std::size_t>(padding));
         out += padding;
     }
     return out;
 }
 
-char* Integer(char* out, const ZonNumberSpec& spec, char sign, unsigned long long magnitude)
+char* Integer(char* out, const ZonNumberConversion& conv, char sign, unsigned long long magnitude)
 {
     char digits[24];
     std::size_t size = static_cast<std::size_t>(std::to_chars(digits, digits + sizeof digits, magnitude).ptr - digits);
     // A precision of 0 prints no digit for 0.
-    if (spec.precision == 0 && magnitude == 0) size = 0;
-    const int zeros = std::max(spec.precision - static_cast<int>(size), 0);
+    if (conv.precision == 0 && magnitude == 0) size = 0;
+    const int zeros = std::max(conv.precision - static_cast<int>(size), 0);
     // A precision turns the '0' flag off.
-    return Field(out, spec, sign, spec.zero && spec.precision < 0, zeros, digits, size);
+    return Field(out, conv, sign, conv.zero && conv.precision < 0, zeros, digits, size);
 }
 
 }  // namespace
 
-bool ZonCloudNumberPrinter::Handles(const ZonNumberSpec& spec)
+bool ZonCloudNumberPrinter::Handles(const ZonNumberConversion& conv)
 {
-    if (spec.precision > MaxPrecision || spec.width > MaxWidth || spec.width < 0) return false;
-    switch (spec.conversion) {
+    if (conv.precision > MaxPrecision || conv.width > MaxWidth || conv.width < 0) return false;
+    switch (conv.letter) {
         case 'd':
         case 'i':
         case 'u':
@@ -195,55 +195,55 @@ bool ZonCloudNumberPrinter::Handles(const ZonNumberSpec& spec)
             return true;
         case 'g':
         case 'G':
-            return !spec.alt;  // '#' keeps the zeros that %g drops: left to the C library
+            return !conv.alt;  // '#' keeps the zeros that %g drops: left to the C library
         default:
             return false;
     }
 }
 
-std::size_t ZonCloudNumberPrinter::Bound(const ZonNumberSpec& spec)
+std::size_t ZonCloudNumberPrinter::Bound(const ZonNumberConversion& conv)
 {
-    return static_cast<std::size_t>(std::max(spec.width, 0)) + static_cast<std::size_t>(std::max(spec.precision, 6)) +
+    return static_cast<std::size_t>(std::max(conv.width, 0)) + static_cast<std::size_t>(std::max(conv.precision, 6)) +
            NumberRoom;
 }
 
-char* ZonCloudNumberPrinter::Print(char* out, const ZonNumberSpec& spec, double value)
+char* ZonCloudNumberPrinter::Print(char* out, const ZonNumberConversion& conv, double value)
 {
     char sign = 0;
     if (std::signbit(value)) sign = '-';
-    else if (spec.plus) sign = '+';
-    else if (spec.space) sign = ' ';
+    else if (conv.plus) sign = '+';
+    else if (conv.space) sign = ' ';
     const double a = std::fabs(value);
     if (!std::isfinite(a)) {
-        const bool upper = Uppercase(spec.conversion);
+        const bool upper = Uppercase(conv.letter);
         const char* text = std::isnan(a) ? (upper ? "NAN" : "nan") : (upper ? "INF" : "inf");
-        return Field(out, spec, sign, false, 0, text, 3);
+        return Field(out, conv, sign, false, 0, text, 3);
     }
-    if (spec.width == 0) {
+    if (conv.width == 0) {
         // Nothing to pad: the digits go straight to out.
         if (sign) *out++ = sign;
-        return FloatDigits(out, spec, a);
+        return FloatDigits(out, conv, a);
     }
     char body[NumberRoom + MaxPrecision + 8];
-    const char* end = FloatDigits(body, spec, a);
-    return Field(out, spec, sign, spec.zero, 0, body, static_cast<std::size_t>(end - body));
+    const char* end = FloatDigits(body, conv, a);
+    return Field(out, conv, sign, conv.zero, 0, body, static_cast<std::size_t>(end - body));
 }
 
-char* ZonCloudNumberPrinter::Print(char* out, const ZonNumberSpec& spec, long long value)
+char* ZonCloudNumberPrinter::Print(char* out, const ZonNumberConversion& conv, long long value)
 {
     char sign = 0;
     if (value < 0) sign = '-';
-    else if (spec.plus) sign = '+';
-    else if (spec.space) sign = ' ';
+    else if (conv.plus) sign = '+';
+    else if (conv.space) sign = ' ';
     // The magnitude of the most negative value too, without overflow.
     const unsigned long long magnitude = value < 0 ? 0ULL - static_cast<unsigned long long>(value)
                                                    : static_cast<unsigned long long>(value);
-    return Integer(out, spec, sign, magnitude);
+    return Integer(out, conv, sign, magnitude);
 }
 
-char* ZonCloudNumberPrinter::Print(char* out, const ZonNumberSpec& spec, unsigned long long value)
+char* ZonCloudNumberPrinter::Print(char* out, const ZonNumberConversion& conv, unsigned long long value)
 {
-    return Integer(out, spec, 0, value);
+    return Integer(out, conv, 0, value);
 }
 
 char* ZonCloudNumberPrinter::Fixed(char* out, double value, int precision)
@@ -251,7 +251,7 @@ char* ZonCloudNumberPrinter::Fixed(char* out, double value, int precision)
     if (std::signbit(value)) *out++ = '-';
     const double a = std::fabs(value);
     if (precision <= 19 && std::isfinite(a) && FixedExact(out, a, precision)) return out;
-    ZonNumberSpec spec;
-    spec.precision = precision;
-    return Print(out, spec, a);
+    ZonNumberConversion conv;
+    conv.precision = precision;
+    return Print(out, conv, a);
 }

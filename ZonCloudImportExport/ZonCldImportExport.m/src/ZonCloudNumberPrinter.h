@@ -5,8 +5,8 @@
 
 // One printf conversion of a number, decoded: flags, field width, precision
 // and the conversion letter (d i u f F e E g G).
-struct ZonNumberSpec {
-    char conversion = 'f';
+struct ZonNumberConversion {
+    char letter = 'f';
     bool left = false;   // '-'
     bool plus = false;   // '+'
     bool space = false;  // ' '
@@ -25,16 +25,16 @@ class ZON_CLD_API ZonCloudNumberPrinter {
 public:
     // Whether Print takes this conversion; the rest (%#g, huge precisions or
     // widths) is left to the C library.
-    static bool Handles(const ZonNumberSpec& spec);
-    // The most characters Print can write for spec, whatever the value.
-    static std::size_t Bound(const ZonNumberSpec& spec);
+    static bool Handles(const ZonNumberConversion& conv);
+    // The most characters Print can write for conv, whatever the value.
+    static std::size_t Bound(const ZonNumberConversion& conv);
 
-    // Write at out, which has room for Bound(spec) characters, and return the
+    // Write at out, which has room for Bound(conv) characters, and return the
     // end. A floating conversion takes a double, d and i a signed and u an
     // unsigned integer.
-    static char* Print(char* out, const ZonNumberSpec& spec, double value);
-    static char* Print(char* out, const ZonNumberSpec& spec, long long value);
-    static char* Print(char* out, const ZonNumberSpec& spec, unsigned long long value);
+    static char* Print(char* out, const ZonNumberConversion& conv, double value);
+    static char* Print(char* out, const ZonNumberConversion& conv, long long value);
+    static char* Print(char* out, const ZonNumberConversion& conv, unsigned long long value);
 
     // "%.<precision>f" with no flags or width: the writers' usual number.
     // Room for 330 + precision characters.

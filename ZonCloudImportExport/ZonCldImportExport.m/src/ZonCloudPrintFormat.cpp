@@ -83,11 +83,11 @@ bool EmitUnsigned(std::string& out, const char* directive, std::va_list& args, L
 
 // Appends a number through the module's printer.
 template <class T>
-void AppendNumber(std::string& out, const ZonNumberSpec& spec, T value)
+void AppendNumber(std::string& out, const ZonNumberConversion& conv, T value)
 {
     const std::size_t start = out.size();
-    out.resize(start + ZonCloudNumberPrinter::Bound(spec));
-    char* end = ZonCloudNumberPrinter::Print(out.data() + start, spec, value);
+    out.resize(start + ZonCloudNumberPrinter::Bound(conv));
+    char* end = ZonCloudNumberPrinter::Print(out.data() + start, conv, value);
     out.resize(static_cast<std::size_t>(end - out.data()));
 }
 
@@ -155,22 +155,22 @@ int ZonPrintV(std::string& out, const char* format, std::va_list arguments)
         // the grouping flags dropped.
         // The same directive is decoded for the module's number printer.
         directive.assign("%");
-        ZonNumberSpec spec;
-        bool specValid = true;
+        ZonNumberConversion conv;
+        bool convValid = true;
         while (*p && std::strchr("-+ #0'I", *p)) {
             if (*p != '\'' && *p != 'I') directive += *p;
-            spec.left |= *p == '-';
-            spec.plus |= *p == '+';
-            spec.space |= *p == ' ';
-            spec.alt |= *p == '#';
-            spec.zero |= *p == '0';
+            conv.left |= *p == '-';
+            conv.plus |= *p == '+';
+            conv.space |= *p == ' ';
+            conv.alt |= *p == '#';
+            conv.zero |= *p == '0';
             ++p;
         }
         const auto readNumber = [&](int& value) {
             value = 0;
             for (; *p >= '0' && *p <= '9'; ++p) {
                 directive += *p;
-                if (value > 100'000'000) specValid = false;
+                if (value > 100'000'000) convValid = false;
                 else value = value * 10 + (*p - '0');
             }
         };
@@ -178,12 +178,12 @@ int ZonPrintV(std::string& out, const char* format, std::va_list arguments)
             const int width = va_arg(args, int);
             AppendNumber(directive, width);
             // A negative width left-aligns, as in printf.
-            if (width < 0) spec.left = true;
-            if (width == std::numeric_limits<int>::min()) specValid = false;
-            else spec.width = width < 0 ? -width : width;
+            if (width < 0) conv.left = true;
+            if (width == std::numeric_limits<int>::min()) convValid = false;
+            else conv.width = width < 0 ? -width : width;
             ++p;
         } else {
-            readNumber(spec.width);
+            readNumber(conv.width);
         }
         if (*p == '.') {
             directive += *p++;
@@ -192,10 +192,10 @@ int ZonPrintV(std::string& out, const char* format, std::va_list arguments)
                 // A negative precision counts as none, as in printf.
                 if (precision >= 0) AppendNumber(directive, precision);
                 else directive.pop_back();
-                spec.precision = precision < 0 ? -1 : precision;
+                conv.precision = precision < 0 ? -1 : precision;
                 ++p;
             } else {
-                readNumber(spec.precision);
+                readNumber(conv.precision);
             }
         }
         Length length = Length::None;
@@ -213,19 +213,19 @@ int ZonPrintV(std::string& out, const char* format, std::va_list arguments)
         directive.append(lengthStart, static_cast<std::size_t>(p - lengthStart));
         const char conversion = *p;
         bool done = false;
-        spec.conversion = conversion;
-        const bool fast = specValid && ZonCloudNumberPrinter::Handles(spec);
+        conv.letter = conversion;
+        const bool fast = convValid && ZonCloudNumberPrinter::Handles(conv);
         if (conversion && fast && (conversion == 'd' || conversion == 'i') && length != Length::LongDouble) {
-            AppendNumber(out, spec, SignedArgument(args, length));
+            AppendNumber(out, conv, SignedArgument(args, length));
             done = true;
             ++p;
         } else if (conversion && fast && conversion == 'u' && length != Length::LongDouble) {
-            AppendNumber(out, spec, UnsignedArgument(args, length));
+            AppendNumber(out, conv, UnsignedArgument(args, length));
             done = true;
             ++p;
         } else if (conversion && fast && conversion != 'd' && conversion != 'i' && conversion != 'u' &&
                    (length == Length::None || length == Length::Long)) {
-            AppendNumber(out, spec, va_arg(args, double));
+            AppendNumber(out, conv, va_arg(args, double));
             done = true;
             ++p;
         } else if (conversion) {
