@@ -26,8 +26,9 @@ unsigned DefaultCount()
         const auto [ptr, ec] = std::from_chars(text, end, value);
         if (ec == std::errc() && ptr == end && value >= 1 && value <= 64) return value;
     }
-    const unsigned cores = std::thread::hardware_concurrency();
-    return std::clamp(cores, 1u, 8u);
+    // Asking the system for its cores costs a file read: once per process.
+    static const unsigned cores = std::clamp(std::thread::hardware_concurrency(), 1u, 8u);
+    return cores;
 }
 
 // Joins every started thread on every way out of a call.
