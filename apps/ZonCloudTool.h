@@ -59,13 +59,23 @@ struct ZonToolReaderOptions {
     void ApplyToSettings() const;
     bool HasBox() const { return box.size() == 6; }
     ZonMathBox Box() const;
-    // --format when given, else the format that claims the file's extension.
+    // --format when given, else the format that claims the file's extension
+    // (or the text reader that read the file in its place).
     std::string FormatName() const;
     // Creates the reader: by --format when given, else by the file's extension.
     ZonICloudReadFile_var CreateReader(std::string& formatName) const;
     // Imports the file through the import entry, as the host would (by --format
     // when given); the statistics text is the last message.
     std::shared_ptr<ZonCldBody> Import(ZonGeoFactoryProtected& geometry, std::vector<ZonString>& messages) const;
+
+private:
+    // Runs attempt("") (the format --format or the extension chooses); when
+    // that reader refuses a file that is text, the free ASCII reader
+    // tries it, attempt(its name), saying so on standard error; when it fails
+    // too, the first reader's error is raised. --format turns this off.
+    template <class Attempt>
+    auto WithTextFallback(Attempt attempt) const;
+    mutable std::string _readAsText;  // the text reader's name, once it read the file
 };
 
 // Writes numbers so that they read back to the same float or double.

@@ -1,5 +1,8 @@
 #include <charconv>
 #include <cmath>
+#include <exception>
+#include <fstream>
+#include <iostream>
 
 #include "ZonCldBody.h"
 #include "ZonCldImportServices.h"
@@ -40,18 +43,91 @@ ZonMathBox ZonToolReaderOptions::Box() const
 std::string ZonToolReaderOptions::FormatName() const
 {
     if (!format.empty()) return format;
+    if (!_readAsText.empty()) return _readAsText;
     return ZonCldImportServices::FindFormatOfFile(ZonUnicodeString(file)).ToUtf8();
+}
+
+namespace {
+
+// The reader of plain point text, which many programs write under extensions
+// that name a binary format here (".xyz").
+constexpr const char* TextFormat = "ASCII FREE";
+
+// Whether `bytes` are UTF-8; a sequence cut by the end of a partial read is not held against them.
+bool IsUtf8(const unsigned char* bytes, std::size_t size, bool cut)
+{
+    for (std::size_t i = 0; i < size;) {
+        const unsigned char lead = bytes[i];
+        const std::size_t length = lead < 0x80 ? 1 : (lead >> 5) == 0x6 ? 2 : (lead >> 4) == 0xe ? 3 : (lead >> 3) == 0x1e ? 4 : 0;
+        if (length == 0) return false;
+        for (std::size_t k = 1; k < length; ++k) {
+            if (i + k >= size) return cut;
+            if ((bytes[i + k] & 0xc0) != 0x80) return false;
+        }
+        i += length;
+    }
+    return true;
+}
+
+// The file's first 4 KB hold no NUL and are UTF-8. False when it cannot be
+// read: a missing or unreadable file keeps the error its reader gave.
+bool LooksLikeText(const std::string& path)
+{
+    std::ifstream in(path, std::ios::binary);
+    if (!in) return false;
+    unsigned char head[4096];
+    in.read(reinterpret_cast<char*>(head), sizeof head);
+    if (in.bad()) return false;
+    const auto size = static_cast<std::size_t>(in.gcount());
+    if (size == 0 && !in.eof()) return false;  // a directory opens, but does not read
+    for (std::size_t i = 0; i < size; ++i)
+        if (head[i] == 0) return false;
+    return IsUtf8(head, size, size == sizeof head);
+}
+
+}  // namespace
+
+template <class Attempt>
+auto ZonToolReaderOptions::WithTextFallback(Attempt attempt) const
+{
+    try {
+        return attempt(std::string());
+    } catch (const ZonError& error) {
+        const std::exception_ptr first = std::current_exception();
+        if (!format.empty() || !LooksLikeText(file)) std::rethrow_exception(first);
+        std::string chosen;
+        try {
+            chosen = FormatName();
+        } catch (const ZonError&) {
+            std::rethrow_exception(first);  // no reader claims the extension: nothing refused the file
+        }
+        if (chosen == TextFormat) std::rethrow_exception(first);
+        try {
+            auto result = attempt(std::string(TextFormat));
+            _readAsText = TextFormat;
+            std::cerr << "zoncloud: " << file << ": the " << chosen << " reader refused it ("
+                      << error.GetNLSMessage() << "); read as text by the " << TextFormat << " reader\n";
+            return result;
+        } catch (const ZonError&) {
+            std::rethrow_exception(first);
+        }
+    }
 }
 
 ZonICloudReadFile_var ZonToolReaderOptions::CreateReader(std::string& formatName) const
 {
+    ZonICloudReadFile_var reader = WithTextFallback([&](const std::string& name) {
+        ZonCldImporter importer{ZonUnicodeString(name.empty() ? FormatName() : name)};
+        if (!importer.GetFactory()) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Input, "ERR_UnknownExtension");
+        ZonICloudReadFile_var created = importer.CreateReader(ZonUnicodeString(file));
+        if (!created) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Input, "ERR_Failure");
+        created->SetSamplingPercent(static_cast<float>(ZonCldSettings::Instance().GetImportSampling()));
+        created->SetDoublePrecision(doublePrecision);
+        // The analysis runs now, so that a file the reader refuses is known here.
+        created->GetTypeOfDigitization();
+        return created;
+    });
     formatName = FormatName();
-    ZonCldImporter importer{ZonUnicodeString(formatName)};
-    if (!importer.GetFactory()) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Input, "ERR_UnknownExtension");
-    ZonICloudReadFile_var reader = importer.CreateReader(ZonUnicodeString(file));
-    if (!reader) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Input, "ERR_Failure");
-    reader->SetSamplingPercent(static_cast<float>(ZonCldSettings::Instance().GetImportSampling()));
-    reader->SetDoublePrecision(doublePrecision);
     return reader;
 }
 
@@ -93,11 +169,19 @@ std::shared_ptr<ZonCldBody> ZonToolReaderOptions::Import(ZonGeoFactoryProtected&
                                                          std::vector<ZonString>& messages) const
 {
     const ZonMathTransformation placement;
-    ZonMathTransformation inverse;
-    ZonMathBox importBox = HasBox() ? Box() : ZonMathBox();
     const ZonUnicodeString fileName(file);
-    if (format.empty())
-        return ZonCldImportServices::BuildCldBodyFromFile(geometry, fileName, placement, inverse, importBox, messages);
-    return ZonCldImportServices::BuildCldBodyWithFormat(geometry, ZonUnicodeString(format), fileName, placement,
-                                                        inverse, importBox, messages);
+    return WithTextFallback([&](const std::string& name) {
+        ZonMathTransformation inverse;
+        ZonMathBox importBox = HasBox() ? Box() : ZonMathBox();
+        // The notes of a reading that fails are not the file's.
+        std::vector<ZonString> noted;
+        std::shared_ptr<ZonCldBody> body;
+        if (name.empty() && format.empty())
+            body = ZonCldImportServices::BuildCldBodyFromFile(geometry, fileName, placement, inverse, importBox, noted);
+        else
+            body = ZonCldImportServices::BuildCldBodyWithFormat(geometry, ZonUnicodeString(name.empty() ? format : name),
+                                                                fileName, placement, inverse, importBox, noted);
+        messages.insert(messages.end(), noted.begin(), noted.end());
+        return body;
+    });
 }

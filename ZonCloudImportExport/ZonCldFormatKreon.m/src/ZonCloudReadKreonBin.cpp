@@ -1,0 +1,236 @@
+#include "ZonCloudReadKreonBin.h"
+
+#include <algorithm>
+#include <cerrno>
+#include <cmath>
+#include <limits>
+#include <numbers>
+
+#include "ZonCloudReadNLSTool.h"
+
+namespace {
+
+using Tool = ZonCloudReadNLSTool;
+
+constexpr std::uint64_t HeaderSize = 128;
+constexpr std::uint64_t ValueSize = 4;
+constexpr std::uint64_t CentreSize = 8;
+
+template <class T>
+T Little(const unsigned char* p)
+{
+    return ZonCloudByteSource::LoadLittle<T>(p);
+}
+
+[[noreturn]] void ShortRead()
+{
+    errno = ENODATA;
+    Tool::Raise(Tool::Input, nullptr);
+}
+
+}  // namespace
+
+ZonCloudReadKreonBin::ZonCloudReadKreonBin(const ZonUnicodeString& fileName) : ZonCloudReadFile(fileName) {}
+
+void ZonCloudReadKreonBin::SetSamplingPercent(float percent)
+{
+    const float before = _samplingPercent;
+    ZonCloudReadFile::SetSamplingPercent(percent);
+    if (_samplingPercent != before) _cloudRead = false;
+}
+
+ZonCloudReadKreonBin::GridKind ZonCloudReadKreonBin::GetGridKind()
+{
+    Analyse();
+    return _kind;
+}
+
+unsigned ZonCloudReadKreonBin::GetNumberOfRows()
+{
+    Analyse();
+    return static_cast<unsigned>(_rows);
+}
+
+unsigned ZonCloudReadKreonBin::GetNumberOfColumns()
+{
+    Analyse();
+    return static_cast<unsigned>(_columns);
+}
+
+// ---- Analysis ---------------------------------------------------------------
+
+void ZonCloudReadKreonBin::AnalyseFile()
+{
+    _numberOfPoints = 0;
+    _boundingBox = ZonMathBox();
+    _cloud.clear();
+    _cloudRead = false;
+    _cursor.Reset();
+
+    ZonCloudByteSource& source = Source();
+    unsigned char header[HeaderSize];
+    source.Read(header, sizeof header);
+    const auto kind = Little<std::uint16_t>(header + 32);
+    if (header[30] != 1 || header[31] != 0 || Little<std::uint16_t>(header + 70) != 0 ||
+        (kind != Planar && kind != Cylindrical && kind != CylindricalWithCentres))
+        Tool::Raise(Tool::Data, "ERR_UnknownData");
+    _kind = static_cast<GridKind>(kind);
+    _columns = Little<std::uint16_t>(header + 34);
+    _rows = Little<std::uint16_t>(header + 36);
+    _x0 = Little<float>(header + 38);
+    _columnStep = Little<float>(header + 46);
+    _y0 = Little<float>(header + 54);
+    _rowStep = Little<float>(header + 58);
+    for (int r = 0; r < 3; ++r)
+        for (int c = 0; c < 3; ++c) _rotation[r][c] = Little<float>(header + 72 + 4 * (3 * r + c));
+    for (int a = 0; a < 3; ++a) _translation[a] = Little<float>(header + 108 + 4 * a);
+    _values = Little<std::uint32_t>(header + 120);
+    const std::uint64_t centres = Little<std::uint32_t>(header + 124);
+
+    const std::uint64_t nodes = _rows * _columns;
+    if (nodes == 0) Tool::Raise(Tool::Data, "ERR_NoPointFound");
+    if (!source.Fits(_values, nodes, ValueSize)) ShortRead();
+    if (_kind == CylindricalWithCentres) {
+        if (!source.Fits(centres, _rows, CentreSize)) ShortRead();
+        Resize(_centres, 2 * _rows);
+        source.Seek(centres);
+        Resize(_buffer, _rows * CentreSize);
+        source.Read(_buffer.data(), _buffer.size());
+        for (std::size_t i = 0; i < _centres.size(); ++i) _centres[i] = Little<float>(_buffer.data() + 4 * i);
+    }
+    if (_kind != Planar) {
+        Resize(_cos, _columns);
+        Resize(_sin, _columns);
+        for (std::uint64_t i = 0; i < _columns; ++i) {
+            const double angle = static_cast<double>(i) * 2.0 * std::numbers::pi / static_cast<double>(_columns);
+            _cos[i] = std::cos(angle);
+            _sin[i] = std::sin(angle);
+        }
+    }
+
+    // The box of the measured nodes, as they are delivered.
+    float low[3], high[3];
+    for (int a = 0; a < 3; ++a) {
+        low[a] = std::numeric_limits<float>::infinity();
+        high[a] = -std::numeric_limits<float>::infinity();
+    }
+    for (std::uint64_t row = 0; row < _rows; ++row)
+        ForEachNode(row, [&](std::uint64_t column, float value) {
+            if (value == Hole) return;
+            float p[3];
+            Place(row, column, value, p);
+            for (int a = 0; a < 3; ++a) {
+                low[a] = p[a] < low[a] ? p[a] : low[a];
+                high[a] = p[a] > high[a] ? p[a] : high[a];
+            }
+        });
+    if (low[0] <= high[0] && low[1] <= high[1] && low[2] <= high[2])
+        _boundingBox = ZonMathBox(low[0], high[0], low[1], high[1], low[2], high[2]);
+    // Counts are 16-bit each: the product always fits.
+    _numberOfPoints = static_cast<int>(nodes);
+    _digitizationType = DigitizationGrids;
+}
+
+template <class Visit>
+void ZonCloudReadKreonBin::ForEachNode(std::uint64_t row, Visit visit)
+{
+    ZonCloudByteSource& source = Source();
+    Resize(_buffer, _columns * ValueSize);
+    source.Seek(_values + row * _columns * ValueSize);
+    source.Read(_buffer.data(), _buffer.size());
+    const unsigned char* bytes = _buffer.data();
+    for (std::uint64_t column = 0; column < _columns; ++column, bytes += ValueSize)
+        visit(column, Little<float>(bytes));
+}
+
+void ZonCloudReadKreonBin::Place(std::uint64_t row, std::uint64_t column, float value, float out[3]) const
+{
+    const double v = value;
+    const double down = static_cast<double>(row) * _rowStep;
+    double local[3];
+    if (_kind == Planar) {
+        local[0] = static_cast<double>(column) * _columnStep + _x0;
+        local[1] = _y0 - down;
+        local[2] = v;
+    } else {
+        local[0] = v * _cos[column];
+        local[1] = v * _sin[column];
+        local[2] = _y0 - down;
+        if (_kind == CylindricalWithCentres) {
+            local[0] += _centres[2 * row];
+            local[1] += _centres[2 * row + 1];
+        }
+    }
+    for (int a = 0; a < 3; ++a)
+        out[a] = static_cast<float>(_rotation[a][0] * local[0] + _rotation[a][1] * local[1] +
+                                    _rotation[a][2] * local[2] + _translation[a]);
+}
+
+// ---- Reading ----------------------------------------------------------------
+
+void ZonCloudReadKreonBin::FillRow(std::uint64_t row, ZonCloudGridRow& target)
+{
+    Allocating([&] { target.Start(_columns, _samplingPercent); });
+    ForEachNode(row, [&](std::uint64_t column, float value) {
+        const std::int64_t slot = target.SlotOf(column);
+        if (slot < 0 || value == Hole) return;
+        float p[3];
+        Place(row, column, value, p);
+        target.Set(static_cast<std::size_t>(slot), p[0], p[1], p[2]);
+    });
+}
+
+const float* ZonCloudReadKreonBin::GetPoints(unsigned& count)
+{
+    count = 0;
+    Analyse();
+    if (!_cloudRead) {
+        _cloud.clear();
+        // A row of its own, so that the grid row last delivered stays as it was.
+        ZonCloudGridRow cloudRow;
+        Guarded([&] {
+            Reserve(_cloud, 3 * _rows * ZonCloudGridRow::SlotsFor(_columns, _samplingPercent));
+            for (std::uint64_t row = 0; row < _rows; ++row) {
+                FillRow(row, cloudRow);
+                cloudRow.AppendValid(_cloud);
+            }
+        });
+        _cloudRead = true;
+    }
+    count = static_cast<unsigned>(_cloud.size() / 3);
+    return _cloud.empty() ? nullptr : _cloud.data();
+}
+
+void ZonCloudReadKreonBin::RequireGrid()
+{
+    Analyse();
+    if (_digitizationType != DigitizationGrids) Tool::Raise(Tool::Usage, "ERR_NotAGridDigit");
+}
+
+void ZonCloudReadKreonBin::BeginGetGrid()
+{
+    RequireGrid();
+    _cursor.Begin(1);
+}
+
+bool ZonCloudReadKreonBin::NextGrid()
+{
+    RequireGrid();
+    return _cursor.Next();
+}
+
+void ZonCloudReadKreonBin::BeginGetGridPoints()
+{
+    RequireGrid();
+    _cursor.BeginRows();
+}
+
+const float* ZonCloudReadKreonBin::GetGridPoints(unsigned& count, const unsigned char*& valid)
+{
+    count = 0;
+    valid = nullptr;
+    RequireGrid();
+    if (!_cursor.NextRow(static_cast<std::size_t>(_rows))) return nullptr;
+    Guarded([&] { FillRow(_cursor.Row(), _row); });
+    return _row.Deliver(count, valid);
+}

@@ -1,0 +1,70 @@
+#pragma once
+#include <cstdint>
+#include <vector>
+
+#include "ZonCloudGridCursor.h"
+#include "ZonCloudGridRow.h"
+#include "ZonCloudReadFile.h"
+#include "ZonTieCloudReadFile.h"
+
+// Range grids of a laser scanner: one range value per node, the nodes laid
+// out in a plane or around a cylinder (whose rows may each have their own
+// centre), and a placement that carries the grid's local coordinates into the
+// model. The file is one grid, delivered row by row with a hole where a node
+// holds no measurement, or its measured nodes as a cloud.
+//
+// Rows run downward: row j lies j steps below the first. Around a cylinder,
+// column i lies at the angle i * 2 pi / N. The analysis checks the header,
+// reads the row centres and walks the value table once for the box; rows are
+// then read back straight from the table.
+class ZonCloudReadKreonBin : public ZonCloudReadFile, public ZonTieCloudReadGridFile<ZonCloudReadKreonBin> {
+public:
+    enum GridKind { Planar = 1, Cylindrical = 2, CylindricalWithCentres = 6 };
+    // The value of a node without measurement.
+    static constexpr float Hole = -32767.0f;
+
+    explicit ZonCloudReadKreonBin(const ZonUnicodeString& fileName);
+
+    // ZonICloudReadFile: the measured nodes, sampled along each row as the rows are.
+    void SetSamplingPercent(float percent) override;
+    const float* GetPoints(unsigned& count) override;
+
+    // ZonICloudReadGridFile: one grid of M rows.
+    void BeginGetGrid() override;
+    bool NextGrid() override;
+    void BeginGetGridPoints() override;
+    const float* GetGridPoints(unsigned& count, const unsigned char*& valid) override;
+    using ZonCloudReadFile::GetGridPointsInBox;
+    using ZonCloudReadFile::GetGridPointsInBoxDouble;
+
+    GridKind GetGridKind();
+    unsigned GetNumberOfRows();
+    unsigned GetNumberOfColumns();
+
+protected:
+    void AnalyseFile() override;
+
+private:
+    // Calls visit(column, value) for each node of row j (from 0).
+    template <class Visit>
+    void ForEachNode(std::uint64_t row, Visit visit);
+    // The model point of the node at (row, column) holding `value`.
+    void Place(std::uint64_t row, std::uint64_t column, float value, float out[3]) const;
+    void FillRow(std::uint64_t row, ZonCloudGridRow& target);
+    void RequireGrid();
+
+    GridKind _kind = Planar;
+    std::uint64_t _columns = 0, _rows = 0;
+    double _x0 = 0, _columnStep = 0, _y0 = 0, _rowStep = 0;
+    double _rotation[3][3] = {};
+    double _translation[3] = {};
+    std::uint64_t _values = 0;       // offset of the value table
+    std::vector<float> _centres;     // cx, cy per row (cylinders with centres)
+    std::vector<double> _cos, _sin;  // per column (cylinders)
+    std::vector<unsigned char> _buffer;
+
+    ZonCloudGridCursor _cursor;
+    ZonCloudGridRow _row;
+    std::vector<float> _cloud;
+    bool _cloudRead = false;
+};
