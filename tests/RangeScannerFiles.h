@@ -127,7 +127,9 @@ inline std::string OptonFile(const OptonGrid& g)
     std::string data;
     for (const OptonRecord& r : g.records)
         for (float v : r) PutOrdered(data, v);
-    const auto offset = static_cast<std::size_t>((static_cast<long>(g.extra) + 3) * 16);
+    const long start = (static_cast<long>(g.extra) + 3) * 16;
+    if (start < 0) return bytes;  // data before the file: none written
+    const auto offset = static_cast<std::size_t>(start);
     bytes.resize(std::max(bytes.size(), offset + data.size()), '\0');
     bytes.replace(offset, data.size(), data);
     return bytes;
