@@ -131,6 +131,7 @@ void ZonCloudReadHyscanBin::AnalyseFile()
     _profiles.clear();
     _numberOfPoints = 0;
     _boundingBox = ZonMathBox();
+    _boxKnown = false;
     _cloud.clear();
     _cloudRead = false;
     _setBegun = _setGiven = _scanBegun = _hasScan = false;
@@ -138,12 +139,6 @@ void ZonCloudReadHyscanBin::AnalyseFile()
     ReadHeader();
     ZonCloudByteSource& source = Source();
     const unsigned expected = _kind == AxesXYZ ? 3u : _kind <= AxesXY ? 2u : 1u;
-
-    float low[3], high[3];
-    for (int a = 0; a < 3; ++a) {
-        low[a] = std::numeric_limits<float>::infinity();
-        high[a] = -std::numeric_limits<float>::infinity();
-    }
     std::uint64_t total = 0;
     std::uint64_t offset = HeaderSize;
     unsigned char group[GroupHeaderSize];
@@ -162,50 +157,90 @@ void ZonCloudReadHyscanBin::AnalyseFile()
             source.Read(profileHeader, sizeof profileHeader);
             offset += ProfileHeaderSize;
             if (_valuesPerPoint != expected) Tool::Raise(Tool::Input, "ERR_UnknownData");
-            Profile profile{offset, Word(profileHeader + ProfilePoints)};
+            const Profile profile{offset, Word(profileHeader + ProfilePoints)};
+            // The values are all there: later reads of them cannot come short.
             if (!source.Fits(offset, std::uint64_t{profile.points} * _valuesPerPoint, ValueSize)) ShortRead();
             offset += std::uint64_t{profile.points} * _valuesPerPoint * ValueSize;
             total += profile.points;
             if (total > static_cast<std::uint64_t>(std::numeric_limits<int>::max()))
                 Tool::Raise(Tool::Data, "ERR_UnknownData");
             Allocating([&] { _profiles.push_back(profile); });
-            ForEachPoint(profile, [&](float x, float y, float z) {
-                const float v[3] = {x, y, z};
-                for (int a = 0; a < 3; ++a) {
-                    low[a] = v[a] < low[a] ? v[a] : low[a];
-                    high[a] = v[a] > high[a] ? v[a] : high[a];
-                }
-            });
         }
     }
     if (total == 0) Tool::Raise(Tool::Data, "ERR_NoPointFound");
     _numberOfPoints = static_cast<int>(total);
-    if (low[0] <= high[0] && low[1] <= high[1] && low[2] <= high[2])
-        _boundingBox = ZonMathBox(low[0], high[0], low[1], high[1], low[2], high[2]);
     _digitizationType = DigitizationScans;
 }
 
+void ZonCloudReadHyscanBin::GetBoundingBox(ZonMathBox& box)
+{
+    Analyse();
+    if (!_boxKnown) {
+        float low[3], high[3];
+        for (int a = 0; a < 3; ++a) {
+            low[a] = std::numeric_limits<float>::infinity();
+            high[a] = -std::numeric_limits<float>::infinity();
+        }
+        Guarded([&] {
+            for (const Profile& profile : _profiles)
+                ForEachChunk(profile, [&](const float* xyz, std::uint64_t n) {
+                    for (const float* p = xyz; p != xyz + 3 * n; p += 3)
+                        for (int a = 0; a < 3; ++a) {
+                            low[a] = p[a] < low[a] ? p[a] : low[a];
+                            high[a] = p[a] > high[a] ? p[a] : high[a];
+                        }
+                });
+        });
+        _boundingBox = ZonMathBox();
+        if (low[0] <= high[0] && low[1] <= high[1] && low[2] <= high[2])
+            _boundingBox = ZonMathBox(low[0], high[0], low[1], high[1], low[2], high[2]);
+        _boxKnown = true;
+    }
+    box = _boundingBox;
+}
+
 template <class Visit>
-void ZonCloudReadHyscanBin::ForEachPoint(const Profile& profile, Visit visit)
+void ZonCloudReadHyscanBin::ForEachChunk(const Profile& profile, Visit visit)
 {
     if (profile.points == 0) return;
     ZonCloudByteSource& source = Source();
     source.Seek(profile.values);
     const std::uint64_t pointSize = _valuesPerPoint * ValueSize;
     const std::uint64_t perChunk = Chunk / pointSize;
-    Resize(_buffer, std::min<std::uint64_t>(profile.points, perChunk) * pointSize);
+    const std::uint64_t most = std::min<std::uint64_t>(profile.points, perChunk);
+    Resize(_buffer, most * pointSize);
+    Resize(_decoded, 3 * most);
+    const bool straight = _kind == AxesXYZ && !_reversed && std::endian::native == std::endian::little;
     for (std::uint64_t left = profile.points; left > 0;) {
         const std::uint64_t n = std::min(left, perChunk);
-        source.Read(_buffer.data(), static_cast<std::size_t>(n * pointSize));
-        const unsigned char* bytes = _buffer.data();
-        for (std::uint64_t i = 0; i < n; ++i) {
-            float p[3] = {0.0f, 0.0f, 0.0f};
-            for (unsigned v = 0; v < _valuesPerPoint; ++v, bytes += ValueSize)
-                p[_axes[v]] = std::bit_cast<float>(Word(bytes));
-            visit(p[0], p[1], p[2]);
+        float* out = _decoded.data();
+        if (straight) {
+            // Stored as the triples are held: read into them directly.
+            source.Read(out, static_cast<std::size_t>(n * pointSize));
+        } else {
+            source.Read(_buffer.data(), static_cast<std::size_t>(n * pointSize));
+            const unsigned char* bytes = _buffer.data();
+            std::fill(out, out + 3 * n, 0.0f);
+            for (std::uint64_t i = 0; i < n; ++i, out += 3)
+                for (unsigned v = 0; v < _valuesPerPoint; ++v, bytes += ValueSize)
+                    out[_axes[v]] = std::bit_cast<float>(Word(bytes));
         }
+        visit(static_cast<const float*>(_decoded.data()), n);
         left -= n;
     }
+}
+
+void ZonCloudReadHyscanBin::AppendSampled(const Profile& profile, ZonCloudSampler& sampler, std::vector<float>& out)
+{
+    const bool all = sampler.Step() >= 1.0f;
+    ForEachChunk(profile, [&](const float* xyz, std::uint64_t n) {
+        if (all) {
+            out.insert(out.end(), xyz, xyz + 3 * n);
+            return;
+        }
+        for (const float* p = xyz; p != xyz + 3 * n; p += 3)
+            if (sampler.Keep()) out.insert(out.end(), p, p + 3);
+    });
 }
 
 // ---- Reading ----------------------------------------------------------------
@@ -221,13 +256,7 @@ const float* ZonCloudReadHyscanBin::GetPoints(unsigned& count)
             const auto total = static_cast<std::uint64_t>(_numberOfPoints);
             const auto capacity = static_cast<std::uint64_t>(static_cast<float>(total) * sampler.Step()) + 1;
             Reserve(_cloud, 3 * std::min(total, capacity));
-            for (const Profile& profile : _profiles)
-                ForEachPoint(profile, [&](float x, float y, float z) {
-                    if (!sampler.Keep()) return;
-                    _cloud.push_back(x);
-                    _cloud.push_back(y);
-                    _cloud.push_back(z);
-                });
+            for (const Profile& profile : _profiles) AppendSampled(profile, sampler, _cloud);
         });
         _cloudRead = true;
     }
@@ -289,12 +318,7 @@ const float* ZonCloudReadHyscanBin::GetScanPoints(unsigned& count)
         _scan.clear();
         Guarded([&] {
             Reserve(_scan, 3 * std::uint64_t{_profiles[_profile].points});
-            ForEachPoint(_profiles[_profile], [&](float x, float y, float z) {
-                if (!_scanSampler.Keep()) return;
-                _scan.push_back(x);
-                _scan.push_back(y);
-                _scan.push_back(z);
-            });
+            AppendSampled(_profiles[_profile], _scanSampler, _scan);
         });
         _scanRead = true;
     }

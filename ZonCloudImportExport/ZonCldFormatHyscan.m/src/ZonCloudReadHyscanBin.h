@@ -14,9 +14,9 @@
 // Files come in either byte order: a header word that reads as a multiple of
 // 65536 above it was written the other way round, and every 32-bit value is
 // then reversed. A point stores one, two or three of its coordinates; the
-// others are 0. The analysis walks every profile once (count, box) and keeps
-// where each one's values start, so that scans and the cloud read them back
-// directly.
+// others are 0. The analysis walks the group and profile headers (counts,
+// and where each profile's values start, so that scans and the cloud read
+// them back directly); the box is worked out from the points when asked.
 class ZonCloudReadHyscanBin : public ZonCloudReadFile, public ZonTieCloudReadScanFile<ZonCloudReadHyscanBin> {
 public:
     // What a point stores, named by the header's axis letters.
@@ -28,6 +28,7 @@ public:
     void SetSamplingPercent(float percent) override;
     const float* GetPoints(unsigned& count) override;
     ZonICkeUnit_var GetLengthUnit() override;
+    void GetBoundingBox(ZonMathBox& box) override;
 
     // ZonICloudReadScanFile: one set, one scan per profile. The sampling runs
     // on from one scan to the next, as over the whole file.
@@ -54,9 +55,11 @@ private:
     };
 
     void ReadHeader();
-    // Calls visit(x, y, z) for each point of the profile.
+    // Calls visit(xyz, n) for the profile's points, n at a time as x, y, z triples.
     template <class Visit>
-    void ForEachPoint(const Profile& profile, Visit visit);
+    void ForEachChunk(const Profile& profile, Visit visit);
+    // Appends the profile's points, those the sampler keeps.
+    void AppendSampled(const Profile& profile, ZonCloudSampler& sampler, std::vector<float>& out);
     std::uint32_t Word(const unsigned char* bytes) const;
     void RequireScans();
 
@@ -67,6 +70,8 @@ private:
     unsigned _valuesPerPoint = 0;
     int _axes[3] = {};  // the axis of each stored value
     std::vector<unsigned char> _buffer;
+    std::vector<float> _decoded;  // a chunk of points as triples
+    bool _boxKnown = false;
 
     std::vector<float> _cloud;
     bool _cloudRead = false;

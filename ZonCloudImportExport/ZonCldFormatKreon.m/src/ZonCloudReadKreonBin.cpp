@@ -63,6 +63,7 @@ void ZonCloudReadKreonBin::AnalyseFile()
 {
     _numberOfPoints = 0;
     _boundingBox = ZonMathBox();
+    _boxKnown = false;
     _cloud.clear();
     _cloudRead = false;
     _cursor.Reset();
@@ -98,72 +99,93 @@ void ZonCloudReadKreonBin::AnalyseFile()
         source.Read(_buffer.data(), _buffer.size());
         for (std::size_t i = 0; i < _centres.size(); ++i) _centres[i] = Little<float>(_buffer.data() + 4 * i);
     }
-    if (_kind != Planar) {
-        Resize(_cos, _columns);
-        Resize(_sin, _columns);
-        for (std::uint64_t i = 0; i < _columns; ++i) {
+    // Planar: local (x_i, y_j, v); cylinders: (v cos t_i + cx_j, v sin t_i + cy_j, z_j).
+    Resize(_columnBase, 3 * _columns);
+    Resize(_columnScale, 3 * _columns);
+    for (std::uint64_t i = 0; i < _columns; ++i) {
+        double* base = &_columnBase[3 * i];
+        double* scale = &_columnScale[3 * i];
+        if (_kind == Planar) {
+            const double x = static_cast<double>(i) * _columnStep + _x0;
+            for (int a = 0; a < 3; ++a) {
+                base[a] = _rotation[a][0] * x;
+                scale[a] = _rotation[a][2];
+            }
+        } else {
             const double angle = static_cast<double>(i) * 2.0 * std::numbers::pi / static_cast<double>(_columns);
-            _cos[i] = std::cos(angle);
-            _sin[i] = std::sin(angle);
+            const double c = std::cos(angle), s = std::sin(angle);
+            for (int a = 0; a < 3; ++a) {
+                base[a] = 0.0;
+                scale[a] = _rotation[a][0] * c + _rotation[a][1] * s;
+            }
         }
     }
-
-    // The box of the measured nodes, as they are delivered.
-    float low[3], high[3];
-    for (int a = 0; a < 3; ++a) {
-        low[a] = std::numeric_limits<float>::infinity();
-        high[a] = -std::numeric_limits<float>::infinity();
-    }
-    for (std::uint64_t row = 0; row < _rows; ++row)
-        ForEachNode(row, [&](std::uint64_t column, float value) {
-            if (value == Hole) return;
-            float p[3];
-            Place(row, column, value, p);
-            for (int a = 0; a < 3; ++a) {
-                low[a] = p[a] < low[a] ? p[a] : low[a];
-                high[a] = p[a] > high[a] ? p[a] : high[a];
-            }
-        });
-    if (low[0] <= high[0] && low[1] <= high[1] && low[2] <= high[2])
-        _boundingBox = ZonMathBox(low[0], high[0], low[1], high[1], low[2], high[2]);
+    _boxKnown = false;
     // Counts are 16-bit each: the product always fits.
     _numberOfPoints = static_cast<int>(nodes);
     _digitizationType = DigitizationGrids;
 }
 
+void ZonCloudReadKreonBin::GetBoundingBox(ZonMathBox& box)
+{
+    Analyse();
+    if (!_boxKnown) {
+        float low[3], high[3];
+        for (int a = 0; a < 3; ++a) {
+            low[a] = std::numeric_limits<float>::infinity();
+            high[a] = -std::numeric_limits<float>::infinity();
+        }
+        Guarded([&] {
+            for (std::uint64_t row = 0; row < _rows; ++row)
+                ForEachMeasured(row, [&](std::uint64_t, const float* p) {
+                    for (int a = 0; a < 3; ++a) {
+                        low[a] = p[a] < low[a] ? p[a] : low[a];
+                        high[a] = p[a] > high[a] ? p[a] : high[a];
+                    }
+                });
+        });
+        _boundingBox = ZonMathBox();
+        if (low[0] <= high[0] && low[1] <= high[1] && low[2] <= high[2])
+            _boundingBox = ZonMathBox(low[0], high[0], low[1], high[1], low[2], high[2]);
+        _boxKnown = true;
+    }
+    box = _boundingBox;
+}
+
 template <class Visit>
-void ZonCloudReadKreonBin::ForEachNode(std::uint64_t row, Visit visit)
+void ZonCloudReadKreonBin::ForEachMeasured(std::uint64_t row, Visit visit)
 {
     ZonCloudByteSource& source = Source();
     Resize(_buffer, _columns * ValueSize);
     source.Seek(_values + row * _columns * ValueSize);
     source.Read(_buffer.data(), _buffer.size());
-    const unsigned char* bytes = _buffer.data();
-    for (std::uint64_t column = 0; column < _columns; ++column, bytes += ValueSize)
-        visit(column, Little<float>(bytes));
-}
 
-void ZonCloudReadKreonBin::Place(std::uint64_t row, std::uint64_t column, float value, float out[3]) const
-{
-    const double v = value;
+    // What the row adds: its height along the axis (planar y, cylinder z) and its centre.
     const double down = static_cast<double>(row) * _rowStep;
-    double local[3];
+    double local[3] = {0.0, 0.0, _y0 - down};
     if (_kind == Planar) {
-        local[0] = static_cast<double>(column) * _columnStep + _x0;
         local[1] = _y0 - down;
-        local[2] = v;
-    } else {
-        local[0] = v * _cos[column];
-        local[1] = v * _sin[column];
-        local[2] = _y0 - down;
-        if (_kind == CylindricalWithCentres) {
-            local[0] += _centres[2 * row];
-            local[1] += _centres[2 * row + 1];
-        }
+        local[2] = 0.0;
+    } else if (_kind == CylindricalWithCentres) {
+        local[0] = _centres[2 * row];
+        local[1] = _centres[2 * row + 1];
     }
+    double rowBase[3];
     for (int a = 0; a < 3; ++a)
-        out[a] = static_cast<float>(_rotation[a][0] * local[0] + _rotation[a][1] * local[1] +
-                                    _rotation[a][2] * local[2] + _translation[a]);
+        rowBase[a] = _rotation[a][0] * local[0] + _rotation[a][1] * local[1] + _rotation[a][2] * local[2] + _translation[a];
+
+    const unsigned char* bytes = _buffer.data();
+    const double* base = _columnBase.data();
+    const double* scale = _columnScale.data();
+    for (std::uint64_t column = 0; column < _columns; ++column, bytes += ValueSize, base += 3, scale += 3) {
+        const float value = Little<float>(bytes);
+        if (value == Hole) continue;
+        const double v = value;
+        const float p[3] = {static_cast<float>(rowBase[0] + base[0] + scale[0] * v),
+                            static_cast<float>(rowBase[1] + base[1] + scale[1] * v),
+                            static_cast<float>(rowBase[2] + base[2] + scale[2] * v)};
+        visit(column, p);
+    }
 }
 
 // ---- Reading ----------------------------------------------------------------
@@ -171,12 +193,9 @@ void ZonCloudReadKreonBin::Place(std::uint64_t row, std::uint64_t column, float 
 void ZonCloudReadKreonBin::FillRow(std::uint64_t row, ZonCloudGridRow& target)
 {
     Allocating([&] { target.Start(_columns, _samplingPercent); });
-    ForEachNode(row, [&](std::uint64_t column, float value) {
+    ForEachMeasured(row, [&](std::uint64_t column, const float* p) {
         const std::int64_t slot = target.SlotOf(column);
-        if (slot < 0 || value == Hole) return;
-        float p[3];
-        Place(row, column, value, p);
-        target.Set(static_cast<std::size_t>(slot), p[0], p[1], p[2]);
+        if (slot >= 0) target.Set(static_cast<std::size_t>(slot), p[0], p[1], p[2]);
     });
 }
 

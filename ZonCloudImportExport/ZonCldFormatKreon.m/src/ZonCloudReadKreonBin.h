@@ -28,6 +28,9 @@ public:
     // ZonICloudReadFile: the measured nodes, sampled along each row as the rows are.
     void SetSamplingPercent(float percent) override;
     const float* GetPoints(unsigned& count) override;
+    // The box of the measured nodes, worked out on the first request (a walk
+    // over the rows needs none).
+    void GetBoundingBox(ZonMathBox& box) override;
 
     // ZonICloudReadGridFile: one grid of M rows.
     void BeginGetGrid() override;
@@ -45,11 +48,10 @@ protected:
     void AnalyseFile() override;
 
 private:
-    // Calls visit(column, value) for each node of row j (from 0).
+    // Calls visit(column, point) for each measured node of row j (from 0),
+    // its point in the model.
     template <class Visit>
-    void ForEachNode(std::uint64_t row, Visit visit);
-    // The model point of the node at (row, column) holding `value`.
-    void Place(std::uint64_t row, std::uint64_t column, float value, float out[3]) const;
+    void ForEachMeasured(std::uint64_t row, Visit visit);
     void FillRow(std::uint64_t row, ZonCloudGridRow& target);
     void RequireGrid();
 
@@ -59,8 +61,12 @@ private:
     double _rotation[3][3] = {};
     double _translation[3] = {};
     std::uint64_t _values = 0;       // offset of the value table
-    std::vector<float> _centres;     // cx, cy per row (cylinders with centres)
-    std::vector<double> _cos, _sin;  // per column (cylinders)
+    std::vector<float> _centres;  // cx, cy per row (cylinders with centres)
+    // The placed point of node (row, column) with value v is
+    // rowBase(row) + _columnBase[column] + _columnScale[column] * v, three
+    // coordinates each: the placement folded into the layout once per column.
+    std::vector<double> _columnBase, _columnScale;
+    bool _boxKnown = false;
     std::vector<unsigned char> _buffer;
 
     ZonCloudGridCursor _cursor;
