@@ -29,7 +29,7 @@ float Word(const unsigned char* record, int index)
 // A count held in a float: whole, not negative, and of a size a file can hold.
 std::uint64_t Count(float value)
 {
-    if (!(value >= 0.0f && value <= 4294967295.0f) || std::trunc(value) != value) NotThisFormat();
+    if (!(value >= 0.0f && value < 4294967296.0f) || std::trunc(value) != value) NotThisFormat();
     return static_cast<std::uint64_t>(value);
 }
 
