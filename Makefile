@@ -20,8 +20,13 @@ demo: build
 test: build
 	cd $(BUILD) && ctest --output-on-failure -j $(JOBS)
 
+# The parallel reading path and the worker pool under the thread sanitizer:
+# only their tests and the readers they drive are built.
+TSAN_ONLY = ZonCldFormatAscii.m|ZonCldFormatLeica.m|ZonCldFormatCgo.m|ZonCldAsciiUserFormat.m|ZonCldFormatStl.m|test_parallel_read|test_worker_pool
+
 sanitize:
 	$(MAKE) test BUILD=build-asan CMAKE_FLAGS="-DZON_SANITIZE=ON -DZON_BENCH=OFF -DCMAKE_BUILD_TYPE=Debug"
+	$(MAKE) test BUILD=build-tsan CMAKE_FLAGS="-DZON_TSAN=ON -DZON_BENCH=OFF -DZON_ONLY='$(TSAN_ONLY)'"
 
 fuzz: setup
 	CXX=clang++ cmake -S . -B build-fuzz -DZON_FUZZ=ON -DCMAKE_BUILD_TYPE=RelWithDebInfo
@@ -31,4 +36,4 @@ bench: build
 	for b in $(BUILD)/bench_*; do $$b; done
 
 clean:
-	rm -rf build build-asan build-fuzz
+	rm -rf build build-asan build-tsan build-fuzz

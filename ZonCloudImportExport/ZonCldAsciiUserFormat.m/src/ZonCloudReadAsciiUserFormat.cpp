@@ -7,6 +7,7 @@
 #include <limits>
 
 #include "ZonCloudByteSource.h"
+#include "ZonCloudChunkedText.h"
 #include "ZonCloudLineSource.h"
 #include "ZonCloudReadNLSTool.h"
 #include "ZonCloudSampler.h"
@@ -105,8 +106,9 @@ double ReadReal(const Token& token)
 }
 
 // An integer column, converted as "%d" would; the target keeps its value when
-// nothing converts. Short runs of digits skip the general scan.
-void ReadInteger(const Token& token, std::int32_t& target)
+// nothing converts (the answer is false then). Short runs of digits skip the
+// general scan.
+bool ReadInteger(const Token& token, std::int32_t& target)
 {
     static const ZonCloudScanFormat integerFormat("%d");
     const char* p = token.text;
@@ -118,20 +120,24 @@ void ReadInteger(const Token& token, std::int32_t& target)
     while (p < end && p - digits < 9 && *p >= '0' && *p <= '9') value = value * 10 + (*p++ - '0');
     if (p > digits && (p == end || !(*p >= '0' && *p <= '9'))) {
         target = negative ? -value : value;
-        return;
+        return true;
     }
     void* const destination[] = {&target, nullptr};
-    integerFormat.Scan(token.text, end, '.', destination);
+    return integerFormat.Scan(token.text, end, '.', destination) == 1;
 }
 
 }  // namespace
 
-// The values one data line gives; the colour and symbol indices live in the
-// reader because a line without those columns inherits them.
+// The values one data line gives. The colour and symbol indices live in the
+// reader because a line without those columns inherits them: a line only
+// tells whether it set them, and to what.
 struct ZonCloudReadAsciiUserFormat::LineValues {
     double x = 0.0, y = 0.0, z = 0.0;
     std::int32_t r = 0, g = 255, b = 0, a = 255;
     int colorCounter = 0;
+    std::int32_t colorIndex = 0, symbolIndex = 0;
+    bool setsColorIndex = false, setsSymbolIndex = false;
+    bool hasAlpha = false, hasSymbol = false, hasText = false;
     std::string text;
 };
 
@@ -271,8 +277,12 @@ void ZonCloudReadAsciiUserFormat::Load(bool asDouble)
         ZonCloudLineSource lines(DataLinePiece);
         lines.Start(source, 0);
         _estimate = EstimateCapacity(lines, static_cast<std::uint64_t>(source.Size()));
-        lines.Start(source, 0);
-        ReadLines(lines);
+        if (const unsigned char* text = ZonCloudChunkedText::MapIfWorth(source, 0)) {
+            ReadLinesInChunks(text);
+        } else {
+            lines.Start(source, 0);
+            ReadLines(lines);
+        }
         // Everything is in memory now.
         CloseSource();
     });
@@ -290,38 +300,85 @@ void ZonCloudReadAsciiUserFormat::ReadLines(ZonCloudLineSource& lines)
     while (lines.Next(first, last)) {
         bool complete = false;
         ParseLine(first, last, values, complete);
-        if (!complete) {
-            if (_completeLines == 0) _dataStart = static_cast<long>(lines.NextOffset());
-            continue;
-        }
-        const auto above255 = [](std::int32_t v) { return static_cast<std::uint32_t>(v) > 255u; };
-        if (above255(values.r) || above255(values.g) || above255(values.b) || above255(values.a))
-            ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_RGBColorOutOfRange");
-        if (static_cast<std::uint32_t>(_colorIndex) > 7u)
-            ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_ColorIndexOutOfRange");
-        if (values.colorCounter == 4) {
-            // COLOR was the line's last colour column: the palette wins.
-            values.r = Palette[_colorIndex][0];
-            values.g = Palette[_colorIndex][1];
-            values.b = Palette[_colorIndex][2];
-            values.a = 255;
-        }
-        if (static_cast<std::uint32_t>(_symbolIndex) > 8u)
-            ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_SymbolIndexOutOfRange");
-        if (_keepColors && (values.colorCounter == 3 || values.colorCounter == 4)) _hasColor = true;
-
-        ++_completeLines;
-        box.AddPoint(values.x, values.y, values.z);
-        if (sampler.Keep()) StorePoint(values);
+        TakeLine(values, complete, lines.NextOffset(), sampler, box);
     }
+    FinishLines(box);
+}
 
+void ZonCloudReadAsciiUserFormat::ReadLinesInChunks(const unsigned char* text)
+{
+    struct Line {
+        LineValues values;
+        bool complete;
+        std::uint64_t nextOffset;
+    };
+    struct Chunk {
+        std::vector<Line> lines;
+    };
+    _colorIndex = 3;
+    _symbolIndex = 0;
+    ZonCloudSampler sampler = ZonCloudSampler::InDouble(_samplingPercent);
+    ZonMathBox box;
+    const auto parse = [&](ZonCloudChunkLines& lines, Chunk& chunk) {
+        const char* first = nullptr;
+        const char* last = nullptr;
+        while (lines.Next(first, last)) {
+            Line& line = chunk.lines.emplace_back();
+            ParseLine(first, last, line.values, line.complete);
+            line.nextOffset = lines.NextOffset();
+        }
+    };
+    const auto stitch = [&](Chunk& chunk) {
+        for (Line& line : chunk.lines) TakeLine(line.values, line.complete, line.nextOffset, sampler, box);
+        return true;
+    };
+    ZonCloudChunkedText::Run<Chunk>(_source, text, 0, DataLinePiece, parse, stitch);
+    FinishLines(box);
+}
+
+void ZonCloudReadAsciiUserFormat::TakeLine(LineValues& values, bool complete, std::uint64_t nextOffset,
+                                           ZonCloudSampler& sampler, ZonMathBox& box)
+{
+    if (values.setsColorIndex) _colorIndex = values.colorIndex;
+    if (values.setsSymbolIndex) _symbolIndex = values.symbolIndex;
+    _hasAlpha |= values.hasAlpha;
+    _hasSymbol |= values.hasSymbol;
+    _hasText |= values.hasText;
+    if (!complete) {
+        if (_completeLines == 0) _dataStart = static_cast<long>(nextOffset);
+        return;
+    }
+    const auto above255 = [](std::int32_t v) { return static_cast<std::uint32_t>(v) > 255u; };
+    if (above255(values.r) || above255(values.g) || above255(values.b) || above255(values.a))
+        ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_RGBColorOutOfRange");
+    if (static_cast<std::uint32_t>(_colorIndex) > 7u)
+        ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_ColorIndexOutOfRange");
+    if (values.colorCounter == 4) {
+        // COLOR was the line's last colour column: the palette wins.
+        values.r = Palette[_colorIndex][0];
+        values.g = Palette[_colorIndex][1];
+        values.b = Palette[_colorIndex][2];
+        values.a = 255;
+    }
+    if (static_cast<std::uint32_t>(_symbolIndex) > 8u)
+        ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_SymbolIndexOutOfRange");
+    if (_keepColors && (values.colorCounter == 3 || values.colorCounter == 4)) _hasColor = true;
+
+    ++_completeLines;
+    box.AddPoint(values.x, values.y, values.z);
+    if (sampler.Keep()) StorePoint(values);
+}
+
+void ZonCloudReadAsciiUserFormat::FinishLines(const ZonMathBox& box)
+{
     if (_completeLines > 0) _boundingBox = box;
     _numberOfPoints = static_cast<int>(std::min<std::int64_t>(_completeLines, std::numeric_limits<int>::max()));
     if (_completeLines == 0) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Data, "ERR_NoPointFound");
     _analysed = true;
 }
 
-void ZonCloudReadAsciiUserFormat::ParseLine(const char* first, const char* last, LineValues& values, bool& complete)
+void ZonCloudReadAsciiUserFormat::ParseLine(const char* first, const char* last, LineValues& values,
+                                            bool& complete) const
 {
     values.x = values.y = values.z = 0.0;
     values.r = 0;
@@ -329,6 +386,8 @@ void ZonCloudReadAsciiUserFormat::ParseLine(const char* first, const char* last,
     values.b = 0;
     values.a = 255;
     values.colorCounter = 0;
+    values.setsColorIndex = values.setsSymbolIndex = false;
+    values.hasAlpha = values.hasSymbol = values.hasText = false;
     values.text.clear();
     complete = false;
 
@@ -390,21 +449,21 @@ void ZonCloudReadAsciiUserFormat::ParseLine(const char* first, const char* last,
                 break;
             case FieldA:
                 ReadInteger(token, values.a);
-                _hasAlpha = true;
+                values.hasAlpha = true;
                 break;
             case FieldColor:
-                ReadInteger(token, _colorIndex);
+                values.setsColorIndex |= ReadInteger(token, values.colorIndex);
                 values.colorCounter = 4;
                 break;
             case FieldSymbol:
-                ReadInteger(token, _symbolIndex);
-                _hasSymbol = true;
+                values.setsSymbolIndex |= ReadInteger(token, values.symbolIndex);
+                values.hasSymbol = true;
                 break;
             case FieldText:
                 values.text += '/';
                 values.text += quoted;
                 values.text += '%';
-                _hasText = true;
+                values.hasText = true;
                 break;
             default:  // LABEL, USELESS_INFO: the column is only consumed
                 break;

@@ -11,6 +11,7 @@
 #include "ZonCloudOwnedArrays.h"
 
 class ZonCloudLineSource;
+class ZonCloudSampler;
 
 // Reads an ASCII user format file: a text point file whose columns are named,
 // in order, by the first line of a separate format description file (FDF).
@@ -100,7 +101,13 @@ private:
     bool Prepare(bool wantDouble);
     std::uint64_t EstimateCapacity(ZonCloudLineSource& lines, std::uint64_t fileSize);
     void ReadLines(ZonCloudLineSource& lines);
-    void ParseLine(const char* first, const char* last, LineValues& values, bool& complete);
+    // The same on every core, over the mapped file `text`.
+    void ReadLinesInChunks(const unsigned char* text);
+    void FinishLines(const ZonMathBox& box);
+    void ParseLine(const char* first, const char* last, LineValues& values, bool& complete) const;
+    // Applies one parsed line in file order: the indices it sets, its checks, its point.
+    void TakeLine(LineValues& values, bool complete, std::uint64_t nextOffset, ZonCloudSampler& sampler,
+                  ZonMathBox& box);
     void StorePoint(const LineValues& values);
     void Grow();
 

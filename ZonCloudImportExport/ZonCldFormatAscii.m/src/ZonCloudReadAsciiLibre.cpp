@@ -8,6 +8,7 @@
 #include <type_traits>
 
 #include "DecimalPointGuard.h"
+#include "ZonCloudChunkedText.h"
 #include "ZonCloudReadNLSTool.h"
 #include "ZonCloudSampler.h"
 
@@ -107,9 +108,12 @@ void ZonCloudReadAsciiLibre::AnalyseFile()
             retryOrRaise("ERR_UnknownData");
             continue;
         }
+        const unsigned char* text = ZonCloudChunkedText::MapIfWorth(source, _dataStart);
         // Usually still in the buffer of the search: no second read.
-        _lines.Start(source, _dataStart);
-        if (CountPoints(guard.DecimalPoint(), low, high) == Pass::TooManyUnknown) {
+        if (!text) _lines.Start(source, _dataStart);
+        const Pass counted = text ? CountPointsInChunks(text, guard.DecimalPoint(), low, high)
+                                  : CountPoints(guard.DecimalPoint(), low, high);
+        if (counted == Pass::TooManyUnknown) {
             retryOrRaise("ERR_UnknownDataOrDelimiter");
             continue;
         }
@@ -192,20 +196,7 @@ ZonCloudReadAsciiLibre::Pass ZonCloudReadAsciiLibre::CountPoints(char decimalPoi
             if (count == INT_MAX) RaiseMemoryError();
             if (!reserved && _keeping) {
                 // Lines of a file tend to be alike: the first one tells how many may follow.
-                const auto lineLength = static_cast<std::size_t>(std::max<std::ptrdiff_t>(last - first, 1));
-                const std::size_t estimate =
-                    static_cast<std::size_t>(std::max<std::int64_t>(fileSize - static_cast<std::int64_t>(_dataStart), 0)) /
-                        lineLength +
-                    16;
-                const std::size_t points = std::min(estimate + estimate / 16, _keepLimit);
-                try {
-                    if (_doublePrecision)
-                        _keptPointsDouble.reserve(3 * points);
-                    else
-                        _keptPoints.reserve(3 * points);
-                } catch (const std::bad_alloc&) {
-                    DropKeptPoints();
-                }
+                ReserveKept(static_cast<std::size_t>(last - first));
                 reserved = true;
             }
             ++count;
@@ -219,14 +210,7 @@ ZonCloudReadAsciiLibre::Pass ZonCloudReadAsciiLibre::CountPoints(char decimalPoi
         }
         if (withDelimiters && IsDelimiterLine(first, last)) {
             _delimitersFound = true;
-            const auto next = static_cast<std::uint32_t>(count);
-            if (_keeping && (_runStarts.empty() || _runStarts.back() != next)) {
-                try {
-                    _runStarts.push_back(next);
-                } catch (const std::bad_alloc&) {
-                    DropKeptPoints();
-                }
-            }
+            KeepRunStart(count);
             continue;
         }
         if (++unknownInARow > kMaxUnknownInARow || ++unknownInAll > kMaxUnknownInAll) return Pass::TooManyUnknown;
@@ -234,6 +218,165 @@ ZonCloudReadAsciiLibre::Pass ZonCloudReadAsciiLibre::CountPoints(char decimalPoi
     _numberOfPoints = static_cast<int>(count);
     _keptAll = _keeping;
     return Pass::Done;
+}
+
+void ZonCloudReadAsciiLibre::ReserveKept(std::size_t lineLength)
+{
+    const std::int64_t fileSize = std::max<std::int64_t>(_source.Size(), 0);
+    const std::size_t estimate =
+        static_cast<std::size_t>(std::max<std::int64_t>(fileSize - static_cast<std::int64_t>(_dataStart), 0)) /
+            std::max<std::size_t>(lineLength, 1) +
+        16;
+    const std::size_t points = std::min(estimate + estimate / 16, _keepLimit);
+    try {
+        if (_doublePrecision)
+            _keptPointsDouble.reserve(3 * points);
+        else
+            _keptPoints.reserve(3 * points);
+    } catch (const std::bad_alloc&) {
+        DropKeptPoints();
+    }
+}
+
+void ZonCloudReadAsciiLibre::KeepRunStart(std::int64_t next)
+{
+    const auto start = static_cast<std::uint32_t>(next);
+    if (_keeping && (_runStarts.empty() || _runStarts.back() != start)) {
+        try {
+            _runStarts.push_back(start);
+        } catch (const std::bad_alloc&) {
+            DropKeptPoints();
+        }
+    }
+}
+
+namespace {
+
+// What a worker makes of one chunk: its points in the precision kept, their
+// box, and a mark for each other line (which follows `pointsBefore` points).
+struct AsciiChunk {
+    struct Mark {
+        std::uint32_t pointsBefore;
+        bool delimiter;
+    };
+    std::vector<float> points;
+    std::vector<double> pointsDouble;
+    std::vector<Mark> marks;
+    std::uint32_t count = 0;
+    std::uint64_t bytes = 0;
+    double low[3] = {DBL_MAX, DBL_MAX, DBL_MAX};
+    double high[3] = {-DBL_MAX, -DBL_MAX, -DBL_MAX};
+};
+
+}  // namespace
+
+ZonCloudReadAsciiLibre::Pass ZonCloudReadAsciiLibre::CountPointsInChunks(const unsigned char* text,
+                                                                         char decimalPoint, double low[3],
+                                                                         double high[3])
+{
+    for (int axis = 0; axis < 3; ++axis) {
+        low[axis] = DBL_MAX;
+        high[axis] = -DBL_MAX;
+    }
+    const std::int64_t fileSize = std::max<std::int64_t>(_source.Size(), 0);
+    const std::size_t pointSize = 3 * (_doublePrecision ? sizeof(double) : sizeof(float));
+    _keepLimit = static_cast<std::size_t>(fileSize) / pointSize;
+    _keeping = _keepLimit > 0;
+
+    const bool withDelimiters = !_beginDelimiter.empty() || !_endDelimiter.empty();
+    const bool inDouble = _doublePrecision;
+    int unknownInARow = 0;
+    int unknownInAll = 0;
+    std::int64_t count = 0;
+    bool reserved = false;
+    Pass result = Pass::Done;
+
+    const auto parse = [&](ZonCloudChunkLines& lines, AsciiChunk& chunk) {
+        const char* first = nullptr;
+        const char* last = nullptr;
+        double xyz[3];
+        std::uint32_t n = 0;
+        while (lines.Next(first, last)) {
+            if (_format.Parse(first, last, decimalPoint, xyz)) {
+                for (int axis = 0; axis < 3; ++axis) {
+                    if (xyz[axis] < chunk.low[axis]) chunk.low[axis] = xyz[axis];
+                    if (xyz[axis] > chunk.high[axis]) chunk.high[axis] = xyz[axis];
+                }
+                if (inDouble)
+                    chunk.pointsDouble.insert(chunk.pointsDouble.end(), xyz, xyz + 3);
+                else
+                    chunk.points.insert(chunk.points.end(), {static_cast<float>(xyz[0]), static_cast<float>(xyz[1]),
+                                                             static_cast<float>(xyz[2])});
+                ++n;
+                continue;
+            }
+            chunk.marks.push_back({n, withDelimiters && IsDelimiterLine(first, last)});
+        }
+        chunk.count = n;
+        chunk.bytes = lines.NextOffset();
+    };
+
+    const auto stitch = [&](AsciiChunk& chunk) {
+        std::uint32_t taken = 0;
+        // The points of the chunk before its next other line, as the line loop takes them one by one.
+        const auto takePoints = [&](std::uint32_t upTo) {
+            const std::uint32_t n = upTo - taken;
+            if (n == 0) return;
+            if (count + n > INT_MAX) RaiseMemoryError();
+            if (!reserved && _keeping) {
+                ReserveKept(static_cast<std::size_t>(chunk.bytes / std::max<std::uint32_t>(chunk.count, 1)));
+                reserved = true;
+            }
+            if (_keeping)
+                KeepPoints(inDouble ? nullptr : chunk.points.data() + 3 * std::size_t{taken},
+                           inDouble ? chunk.pointsDouble.data() + 3 * std::size_t{taken} : nullptr, n);
+            count += n;
+            unknownInARow = 0;
+            taken = upTo;
+        };
+        for (const AsciiChunk::Mark& mark : chunk.marks) {
+            takePoints(mark.pointsBefore);
+            if (mark.delimiter) {
+                _delimitersFound = true;
+                KeepRunStart(count);
+                continue;
+            }
+            if (++unknownInARow > kMaxUnknownInARow || ++unknownInAll > kMaxUnknownInAll) {
+                result = Pass::TooManyUnknown;
+                return false;
+            }
+        }
+        takePoints(chunk.count);
+        // Strict comparisons in file order: the first of equal values stays, as in the line loop.
+        for (int axis = 0; axis < 3; ++axis) {
+            if (chunk.low[axis] < low[axis]) low[axis] = chunk.low[axis];
+            if (chunk.high[axis] > high[axis]) high[axis] = chunk.high[axis];
+        }
+        return true;
+    };
+
+    ZonCloudChunkedText::Run<AsciiChunk>(_source, text, _dataStart, ZonCloudLineSource::FgetsPiece, parse, stitch);
+    if (result != Pass::Done) return result;
+    _numberOfPoints = static_cast<int>(count);
+    _keptAll = _keeping;
+    return Pass::Done;
+}
+
+void ZonCloudReadAsciiLibre::KeepPoints(const float* points, const double* pointsDouble, std::size_t count)
+{
+    const std::size_t kept = (_doublePrecision ? _keptPointsDouble.size() : _keptPoints.size()) / 3;
+    if (kept + count > _keepLimit) {
+        DropKeptPoints();
+        return;
+    }
+    try {
+        if (pointsDouble)
+            _keptPointsDouble.insert(_keptPointsDouble.end(), pointsDouble, pointsDouble + 3 * count);
+        else
+            _keptPoints.insert(_keptPoints.end(), points, points + 3 * count);
+    } catch (const std::bad_alloc&) {
+        DropKeptPoints();
+    }
 }
 
 void ZonCloudReadAsciiLibre::KeepPoint(const double xyz[3])

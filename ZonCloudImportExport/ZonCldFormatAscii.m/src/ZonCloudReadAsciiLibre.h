@@ -75,6 +75,11 @@ private:
     void ResetAnalysis();
     Pass SearchFormat(char decimalPoint);
     Pass CountPoints(char decimalPoint, double low[3], double high[3]);
+    // The same on every core, for large files: `text` is the mapped file.
+    Pass CountPointsInChunks(const unsigned char* text, char decimalPoint, double low[3], double high[3]);
+    void ReserveKept(std::size_t lineLength);
+    void KeepPoints(const float* points, const double* pointsDouble, std::size_t count);
+    void KeepRunStart(std::int64_t next);
     void KeepPoint(const double xyz[3]);
     void DropKeptPoints();
 

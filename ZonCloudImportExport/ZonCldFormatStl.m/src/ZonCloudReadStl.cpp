@@ -8,6 +8,7 @@
 #include <new>
 
 #include "DecimalPointGuard.h"
+#include "ZonCloudChunkedText.h"
 #include "ZonCloudOperErrorTool.h"
 #include "ZonCloudReadNLSTool.h"
 #include "ZonCloudScanFormat.h"
@@ -156,6 +157,14 @@ struct BoxAccumulator {
             high[i] = v[i] > high[i] ? v[i] : high[i];
         }
     }
+    // Another box seen after this one: the first of equal values stays, as when adding one by one.
+    void Merge(const BoxAccumulator& other)
+    {
+        for (int i = 0; i < 3; ++i) {
+            low[i] = other.low[i] < low[i] ? other.low[i] : low[i];
+            high[i] = other.high[i] > high[i] ? other.high[i] : high[i];
+        }
+    }
     bool IsEmpty() const { return !(low[0] <= high[0] && low[1] <= high[1] && low[2] <= high[2]); }
     ZonMathBox Box() const
     {
@@ -209,6 +218,8 @@ void ZonCloudReadStl::Reset()
     _triangleCount = 0;
     _meshLoaded = false;
     _meshInDouble = false;
+    _premerged = false;
+    _premergedInDouble = false;
     _distinctCount = 0;
     _vertices = {};
     _verticesDouble = {};
@@ -254,6 +265,13 @@ bool ZonCloudReadStl::HasVertexLineNearStart()
 
 void ZonCloudReadStl::AnalyseText()
 {
+    if (const unsigned char* text = ZonCloudChunkedText::MapIfWorth(_source, 0)) {
+        if (_doublePrecision)
+            AnalyseTextInChunks(text, _verticesDouble);
+        else
+            AnalyseTextInChunks(text, _vertices);
+        return;
+    }
     DecimalPointGuard separator;
     bool otherTried = false;
     for (;;) {
@@ -330,6 +348,13 @@ void ZonCloudReadStl::AnalyseBinary()
         box.Add(corners + 6);
     };
     const std::uint64_t wanted = static_cast<std::uint64_t>(std::min(choice.count, kMaxTriangles));
+    if (const unsigned char* mapped = ZonCloudChunkedText::MapIfWorth(_source, 0)) {
+        // Whole records, and a last one that lacks only its attribute word.
+        const std::uint64_t bytes = static_cast<std::uint64_t>(size) - 84;
+        const std::uint64_t held = bytes / kRecordSize + (bytes % kRecordSize >= kRecordFloats ? 1 : 0);
+        AnalyseBinaryInChunks(mapped, std::min(wanted, held));
+        return;
+    }
     std::uint64_t records;
     if (_nativeOrder)
         records = ForEachRecord(_source, wanted, buffer, [&](const unsigned char* record) {
@@ -384,6 +409,21 @@ void ZonCloudReadStl::LoadMesh()
 {
     Analyse();
     if (_meshLoaded) return;
+    if (_premerged) {
+        _premerged = false;
+        if (_premergedInDouble == (_isText && _doublePrecision)) {
+            _meshInDouble = _premergedInDouble;
+            CloseSource();
+            _meshLoaded = true;
+            _numberOfPoints = static_cast<int>(std::min<std::size_t>(_distinctCount, std::numeric_limits<int>::max()));
+            return;
+        }
+        // The precision changed since the analysis: read the mesh again.
+        _vertices = {};
+        _verticesDouble = {};
+        _triangles = {};
+        _distinctCount = 0;
+    }
     try {
         Guarded([this] {
             Source();
@@ -496,6 +536,174 @@ void ZonCloudReadStl::ReadBinaryMesh()
     _triangles.resize(3 * static_cast<std::size_t>(stored));
     ShrinkIfLoose(_vertices);
     _distinctCount = _vertices.size() / 3;
+}
+
+namespace {
+
+// Corners merged in file order, their table slots fetched a few corners ahead.
+constexpr std::size_t kAhead = 8;
+
+template <class T>
+struct CornerChunk {
+    std::vector<T> corners;          // three coordinates per parsed corner
+    std::vector<std::uint32_t> hashes;
+    std::vector<std::uint32_t> failures;  // text: corners parsed before each vertex line that failed
+    BoxAccumulator<float> box;            // binary: the box of the chunk's corners
+};
+
+}  // namespace
+
+template <class T>
+void ZonCloudReadStl::AnalyseTextInChunks(const unsigned char* text, std::vector<T>& vertices)
+{
+    const std::uint64_t size = static_cast<std::uint64_t>(_source.Size());
+    // About 250 bytes a facet in the usual layout; the table grows past it.
+    const std::size_t expected = ExpectedDistinct(static_cast<std::uint32_t>(std::min<std::uint64_t>(size / 256, kMaxTriangles)));
+    DecimalPointGuard separator;
+    bool otherTried = false;
+    for (;;) {
+        vertices = {};
+        _triangles = {};
+        Reserve(vertices, 3 * expected);
+        Reserve(_triangles, 6 * expected);
+        ZonCloudVertexTable<T> table(vertices, expected);
+        BoxAccumulator<double> box;
+        std::uint64_t found = 0;
+        int failures = 0;
+        bool retry = false;
+        const char point = separator.DecimalPoint();
+        T pendingCorners[9];
+        std::uint32_t pendingHashes[3];
+        int pending = 0;
+
+        const auto parse = [point](ZonCloudChunkLines& lines, CornerChunk<T>& chunk) {
+            const char* first = nullptr;
+            const char* last = nullptr;
+            while (lines.Next(first, last)) {
+                const char* numbers = AfterKeyword(first, last);
+                if (!numbers) continue;
+                T xyz[3];
+                if (ParseVertex(numbers, last, point, xyz)) {
+                    chunk.corners.insert(chunk.corners.end(), xyz, xyz + 3);
+                    chunk.hashes.push_back(ZonCloudVertexTable<T>::HashOf(xyz));
+                } else {
+                    chunk.failures.push_back(static_cast<std::uint32_t>(chunk.hashes.size()));
+                }
+            }
+        };
+        const auto stitch = [&](CornerChunk<T>& chunk) {
+            std::size_t taken = 0;
+            // Corners as the line loop meets them: counted, boxed, and merged
+            // three by three (a triangle may begin in an earlier chunk) while
+            // the triangles stay countable.
+            const auto take = [&](std::size_t upTo) {
+                if (upTo == taken) return;
+                failures = 0;
+                for (std::size_t i = taken; i < upTo; ++i) {
+                    const T* xyz = chunk.corners.data() + 3 * i;
+                    const double corner[3] = {static_cast<double>(xyz[0]), static_cast<double>(xyz[1]),
+                                              static_cast<double>(xyz[2])};
+                    box.Add(corner);
+                    if (i + kAhead < upTo) table.Prefetch(chunk.hashes[i + kAhead]);
+                    std::copy(xyz, xyz + 3, pendingCorners + 3 * pending);
+                    pendingHashes[pending] = chunk.hashes[i];
+                    if (++pending < 3) continue;
+                    pending = 0;
+                    if (_triangles.size() / 3 >= static_cast<std::size_t>(kMaxTriangles)) continue;
+                    for (int k = 0; k < 3; ++k) _triangles.push_back(table.Index(pendingCorners + 3 * k, pendingHashes[k]));
+                }
+                found += upTo - taken;
+                taken = upTo;
+            };
+            for (const std::uint32_t failure : chunk.failures) {
+                take(failure);
+                if (++failures <= kMaxConsecutiveFailures) continue;
+                // A file written with the other decimal separator fails on every
+                // vertex line: try it once with the other one.
+                if (otherTried || !separator.Switch()) Tool::Raise(Tool::Data, "ERR_TooManyUnknownData");
+                otherTried = true;
+                retry = true;
+                return false;
+            }
+            take(chunk.hashes.size());
+            return true;
+        };
+        ZonCloudChunkedText::Run<CornerChunk<T>>(_source, text, 0, kLineMax, parse, stitch);
+        if (retry) continue;
+        if (found == 0) Tool::Raise(Tool::Data, "ERR_NoPointFound");
+        const std::uint64_t triangles = std::min<std::uint64_t>(found / 3, kMaxTriangles);
+        _triangleCount = static_cast<std::uint32_t>(triangles);
+        _vertexCount = static_cast<std::uint32_t>(std::min<std::uint64_t>(found, 3 * kMaxTriangles));
+        _boundingBox = box.Box();
+        _separatorSwitched = separator.IsSwitched();
+        ShrinkIfLoose(vertices);
+        _distinctCount = vertices.size() / 3;
+        _premerged = true;
+        _premergedInDouble = std::is_same_v<T, double>;
+        return;
+    }
+}
+
+void ZonCloudReadStl::AnalyseBinaryInChunks(const unsigned char* mapped, std::uint64_t records)
+{
+    const std::size_t expected = ExpectedDistinct(static_cast<std::uint32_t>(records));
+    _vertices = {};
+    _triangles = {};
+    Reserve(_vertices, 3 * expected);
+    Reserve(_triangles, 3 * static_cast<std::size_t>(records));
+    ZonCloudVertexTable<float> table(_vertices, expected);
+    BoxAccumulator<float> box;
+    const bool native = _nativeOrder;
+
+    const auto parse = [native](const unsigned char* record, std::size_t count, CornerChunk<float>& chunk) {
+        chunk.corners.resize(9 * count);
+        chunk.hashes.resize(3 * count);
+        for (std::size_t r = 0; r < count; ++r, record += kRecordSize) {
+            float* corners = chunk.corners.data() + 9 * r;
+            if (native)
+                LoadCorners<false>(record, corners);
+            else
+                LoadCorners<true>(record, corners);
+            for (int k = 0; k < 3; ++k) {
+                chunk.box.Add(corners + 3 * k);
+                chunk.hashes[3 * r + static_cast<std::size_t>(k)] = ZonCloudVertexTable<float>::HashOf(corners + 3 * k);
+            }
+        }
+    };
+    const auto stitch = [&](CornerChunk<float>& chunk) {
+        box.Merge(chunk.box);
+        const std::size_t corners = chunk.hashes.size();
+        for (std::size_t i = 0; i < corners; ++i) {
+            if (i + kAhead < corners) table.Prefetch(chunk.hashes[i + kAhead]);
+            _triangles.push_back(table.Index(chunk.corners.data() + 3 * i, chunk.hashes[i]));
+        }
+        return true;
+    };
+    ZonCloudChunkedText::RunRecords<CornerChunk<float>>(_source, mapped, 84, records, kRecordSize, parse, stitch);
+
+    _triangleCount = static_cast<std::uint32_t>(records);
+    _vertexCount = 3 * _triangleCount;
+    const auto forget = [this] {
+        _vertices = {};
+        _triangles = {};
+    };
+    if (records == 0) {
+        forget();
+        Tool::Raise(Tool::Data, "ERR_NoPointFound");
+    }
+    const double extent[3] = {double(box.high[0]) - box.low[0], double(box.high[1]) - box.low[1],
+                              double(box.high[2]) - box.low[2]};
+    const bool plausible = !box.IsEmpty() && extent[0] + extent[1] + extent[2] > 1e-6 &&
+                           extent[0] * extent[1] * extent[2] < 3.4028234663852886e+38;
+    if (!plausible) {
+        forget();
+        Tool::Raise(Tool::Input, "ERR_UnknownData");
+    }
+    _boundingBox = box.Box();
+    ShrinkIfLoose(_vertices);
+    _distinctCount = _vertices.size() / 3;
+    _premerged = true;
+    _premergedInDouble = false;
 }
 
 const float* ZonCloudReadStl::FloatVertices()

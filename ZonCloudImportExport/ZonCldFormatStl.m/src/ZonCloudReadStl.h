@@ -74,6 +74,11 @@ private:
     bool HasVertexLineNearStart();
     void AnalyseText();
     void AnalyseBinary();
+    // Large files, read on every core from the mapped file: the analysis
+    // merges the mesh on the way, so the file is read once.
+    template <class T>
+    void AnalyseTextInChunks(const unsigned char* text, std::vector<T>& vertices);
+    void AnalyseBinaryInChunks(const unsigned char* mapped, std::uint64_t records);
     void LoadMesh();
     template <class T>
     void ReadTextMesh(std::vector<T>& vertices);
@@ -95,6 +100,9 @@ private:
     // time; the other precision is a converted copy made on request.
     bool _meshLoaded = false;
     bool _meshInDouble = false;
+    // The analysis already merged the mesh, in this precision.
+    bool _premerged = false;
+    bool _premergedInDouble = false;
     std::size_t _distinctCount = 0;
     std::vector<float> _vertices;
     std::vector<double> _verticesDouble;

@@ -2,8 +2,11 @@
 
 #include <algorithm>
 #include <cerrno>
+#include <cstdint>
 
+#include <sys/mman.h>
 #include <sys/stat.h>
+#include <unistd.h>
 
 using Tool = ZonCloudReadNLSTool;
 
@@ -35,6 +38,8 @@ void ZonCloudByteSource::OpenMemory(const void* data, std::size_t size)
 
 void ZonCloudByteSource::Close()
 {
+    if (_mapping) munmap(_mapping, static_cast<std::size_t>(_size));
+    _mapping = nullptr;
     if (_file) std::fclose(_file);
     _file = nullptr;
     _memory = nullptr;
@@ -106,4 +111,29 @@ void ZonCloudByteSource::CheckFits(std::uint64_t offset, std::uint64_t count, st
                                    const char* code) const
 {
     if (!Fits(offset, count, recordSize)) Tool::Raise(Tool::Input, code);
+}
+
+const unsigned char* ZonCloudByteSource::Map()
+{
+    if (_memory) return _memory;
+    if (_mapping) return static_cast<const unsigned char*>(_mapping);
+    if (!_file || _size <= 0 || static_cast<std::uint64_t>(_size) > SIZE_MAX) return nullptr;
+    void* mapping = mmap(nullptr, static_cast<std::size_t>(_size), PROT_READ, MAP_PRIVATE, fileno(_file), 0);
+    if (mapping == MAP_FAILED) return nullptr;
+    // Read mostly front to back, a few chunks at a time.
+    madvise(mapping, static_cast<std::size_t>(_size), MADV_SEQUENTIAL);
+    _mapping = mapping;
+    return static_cast<const unsigned char*>(_mapping);
+}
+
+void ZonCloudByteSource::Unneeded(std::uint64_t offset, std::uint64_t count)
+{
+    if (!_mapping || _size <= 0) return;
+    const auto size = static_cast<std::uint64_t>(_size);
+    const std::uint64_t page = static_cast<std::uint64_t>(sysconf(_SC_PAGESIZE));
+    // Whole pages inside the range only: the neighbours may still be read.
+    const std::uint64_t first = (offset + page - 1) / page * page;
+    const std::uint64_t end = std::min(offset + count, size) / page * page;
+    if (first >= end) return;
+    madvise(static_cast<char*>(_mapping) + first, static_cast<std::size_t>(end - first), MADV_DONTNEED);
 }

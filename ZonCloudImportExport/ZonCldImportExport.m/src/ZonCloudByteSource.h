@@ -42,6 +42,14 @@ public:
     // error, or ENODATA when the data simply ended.
     void Read(void* buffer, std::size_t count, ZonCloudReadNLSTool::ErrorType type = ZonCloudReadNLSTool::Input);
 
+    // The whole source as one block of memory: a read-only mapping of a file
+    // (kept until Close), or the bytes of a memory source. Null when the
+    // source cannot be mapped (no size, empty, a special file); the caller
+    // then reads it. Parts already used may be given back with Unneeded, so
+    // that a big file does not stay resident while it is read.
+    const unsigned char* Map();
+    void Unneeded(std::uint64_t offset, std::uint64_t count);
+
     // True when `count` records of `recordSize` bytes from `offset` lie within
     // the source; computed without overflow. False when the size is unknown.
     bool Fits(std::uint64_t offset, std::uint64_t count, std::uint64_t recordSize) const;
@@ -99,4 +107,5 @@ private:
     const unsigned char* _memory = nullptr;
     std::int64_t _size = -1;
     std::uint64_t _position = 0;  // of the memory form
+    void* _mapping = nullptr;     // of a mapped file
 };

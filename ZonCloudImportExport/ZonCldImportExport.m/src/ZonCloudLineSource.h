@@ -37,10 +37,7 @@ public:
         const std::size_t available = _end - _begin;
         if (available == 0) return false;
         const char* start = _buffer.get() + _begin;
-        const std::size_t window = available < _maxPiece ? available : _maxPiece;
-        const void* newline = std::memchr(start, '\n', window);
-        const std::size_t length =
-            newline ? static_cast<std::size_t>(static_cast<const char*>(newline) - start) + 1 : window;
+        const std::size_t length = PieceLength(start, available, _maxPiece);
         _lineOffset = NextOffset();
         _begin += length;
         first = start;
@@ -58,6 +55,16 @@ public:
     }
     // Gives the buffer back (a reader keeps it only while it reads).
     void Release();
+
+    // The length of the piece at `start`, with `available` bytes there (more
+    // than maxPiece unless the data ends): up to its newline, at most maxPiece.
+    // Every reading of lines cuts them here, so that all cut them alike.
+    static std::size_t PieceLength(const char* start, std::size_t available, std::size_t maxPiece)
+    {
+        const std::size_t window = available < maxPiece ? available : maxPiece;
+        const void* newline = std::memchr(start, '\n', window);
+        return newline ? static_cast<std::size_t>(static_cast<const char*>(newline) - start) + 1 : window;
+    }
 
     // The line without its end: "\n" or "\r\n" (or a lone "\r" at the end).
     static std::string_view Chomp(std::string_view line)

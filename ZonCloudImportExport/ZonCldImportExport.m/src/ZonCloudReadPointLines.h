@@ -70,8 +70,20 @@ protected:
     long _dataStart = 0;
 
 private:
+    // What one pass carries from line to line.
+    struct PassState;
+    enum class Next { Go, Stop, Retry };
+
     // One pass over the file; false when it must start again with the other decimal point.
     bool ReadPass(ZonCloudLineSource& lines, char decimalPoint);
+    // The same on every core, over the mapped file `text`.
+    bool ReadPassInChunks(const unsigned char* text, char decimalPoint);
+    void StartPass();
+    void TakePoint(const double xyz[3], const unsigned char rgb[3], PassState& state);
+    // A line that is no point: `announced` is the count of a count line
+    // (0 for any other), `endOfCloud` whether it ends the data.
+    Next TakeOtherLine(int announced, bool endOfCloud, std::uint64_t nextOffset, PassState& state);
+    int Announced(const char* first, const char* last, char decimalPoint) const;
     void MakeRoom(std::uint64_t capacity);
 
     bool _decimalSwapped = false;
