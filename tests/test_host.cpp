@@ -58,6 +58,17 @@ TEST(HostMath, PointArrayBoxSkipsPointsThatAreNotFinite)
             floats.AdoptScaled(std::vector<float>(xyz), 1.0);
             doubles.AssignScaled(std::vector<double>(xyz.begin(), xyz.end()).data(), count, 1.0);
             const double first = odd == 0 ? 1 : 0, last = odd == count - 1 ? double(count) - 2 : double(count) - 1;
+            // The same box when the point is left out by its flag instead, whatever it holds.
+            std::vector<unsigned char> flags(count, 1);
+            flags[odd] = 0;
+            xyz[3 * odd] = odd % 2 ? 1e30f : nan;
+            ZonCldPointArray flagged;
+            flagged.AdoptScaled(std::move(xyz), 1.0);
+            ZonMathBox flaggedBox;
+            flagged.AddToBox(flaggedBox, flags.data());
+            if (count > 1) {
+                EXPECT_TRUE(flaggedBox.IsSameAs(ZonMathBox(first, last, -last, -first, 0.5 * first, 0.5 * last)));
+            }
             for (const ZonCldPointArray* points : {&floats, &doubles}) {
                 ZonMathBox box;
                 points->AddToBox(box);

@@ -2,7 +2,6 @@
 
 #include <algorithm>
 #include <cmath>
-#include <cstring>
 #include <limits>
 #include <type_traits>
 
@@ -10,14 +9,14 @@ namespace {
 template <class To, class From>
 void CopyScaled(std::vector<To>& to, const From* from, std::size_t count, double factor)
 {
-    to.resize(3 * count);
-    if (count == 0) return;
     if constexpr (std::is_same_v<To, From>) {
         if (factor == 1.0) {
-            std::memcpy(to.data(), from, 3 * count * sizeof(To));
+            // Copied straight into fresh memory, not zeroed first.
+            to.assign(from, from + 3 * count);
             return;
         }
     }
+    to.resize(3 * count);
     for (std::size_t i = 0; i < 3 * count; ++i) to[i] = static_cast<To>(static_cast<double>(from[i]) * factor);
 }
 
@@ -32,11 +31,12 @@ void SelectTriples(std::vector<T>& values, const std::vector<std::size_t>& indic
 // Accumulates in the array's own type with plain comparisons (the minimum
 // and maximum of floats are the same taken in float or in double): AddPoint
 // per point is the slow path for millions of points.
-// The box of every point when all coordinates are finite, in one pass that
-// the compiler can vectorise: twelve lanes hold four points, so lane j always
-// sees axis j % 3. False when a coordinate is not finite (x - x is then NaN).
-template <class T>
-bool WholeTriplesBox(const T* p, std::size_t n, T low[3], T high[3])
+// The box of the points whose flag is set (every point without flags) when
+// all their coordinates are finite, in one pass that the compiler can
+// vectorise: twelve lanes hold four points, so lane j always sees axis j % 3
+// of point j / 3. False when a coordinate is not finite (x - x is then NaN).
+template <bool Flagged, class T>
+bool FastTriplesBox(const T* p, const unsigned char* flags, std::size_t n, T low[3], T high[3])
 {
     constexpr std::size_t Lanes = 12;
     constexpr T Infinity = std::numeric_limits<T>::infinity();
@@ -46,21 +46,18 @@ bool WholeTriplesBox(const T* p, std::size_t n, T low[3], T high[3])
         hi[j] = -Infinity;
         odd[j] = 0;
     }
+    const auto take = [&](std::size_t i, std::size_t j) {
+        const T v = p[i];
+        bool keep = true;
+        if constexpr (Flagged) keep = flags[i / 3] != 0;
+        lo[j] = keep && v < lo[j] ? v : lo[j];
+        hi[j] = keep && v > hi[j] ? v : hi[j];
+        odd[j] += keep ? v - v : T(0);
+    };
     const std::size_t values = 3 * n, whole = values / Lanes * Lanes;
     for (std::size_t i = 0; i < whole; i += Lanes)
-        for (std::size_t j = 0; j < Lanes; ++j) {
-            const T v = p[i + j];
-            lo[j] = v < lo[j] ? v : lo[j];
-            hi[j] = v > hi[j] ? v : hi[j];
-            odd[j] += v - v;
-        }
-    for (std::size_t i = whole; i < values; ++i) {
-        const T v = p[i];
-        const std::size_t j = i - whole;
-        lo[j] = v < lo[j] ? v : lo[j];
-        hi[j] = v > hi[j] ? v : hi[j];
-        odd[j] += v - v;
-    }
+        for (std::size_t j = 0; j < Lanes; ++j) take(i + j, j);
+    for (std::size_t i = whole; i < values; ++i) take(i, i - whole);
     for (std::size_t j = 0; j < Lanes; ++j)
         if (odd[j] != 0) return false;
     for (std::size_t j = 0; j < Lanes; ++j) {
@@ -77,8 +74,8 @@ void AddTriplesToBox(const std::vector<T>& xyz, const unsigned char* flags, ZonM
     T low[3] = {Infinity, Infinity, Infinity}, high[3] = {-Infinity, -Infinity, -Infinity};
     std::size_t n = xyz.size() / 3;
     const T* p = xyz.data();
-    // The exact walk below is for flags and for points that are not finite.
-    if (!flags && WholeTriplesBox(p, n, low, high)) n = 0;
+    // The exact walk below is for points that are not finite.
+    if (flags ? FastTriplesBox<true>(p, flags, n, low, high) : FastTriplesBox<false>(p, flags, n, low, high)) n = 0;
     for (std::size_t i = 0; i < n; ++i, p += 3) {
         if (flags && !flags[i]) continue;
         // A point with a missing coordinate has no place in a box.
