@@ -2,8 +2,9 @@
 BUILD ?= build
 JOBS ?= $(shell nproc)
 CMAKE_FLAGS ?=
+SECONDS ?= 60
 
-.PHONY: setup configure build demo test sanitize fuzz bench clean
+.PHONY: setup configure build demo test sanitize fuzz fuzz-run bench install clean
 
 setup:
 	bash scripts/setup.sh
@@ -14,7 +15,9 @@ configure: setup
 build: configure
 	cmake --build $(BUILD) -j $(JOBS)
 
-demo: build
+# Only the libraries and the tool: the tests and benchmarks are left for `make test`.
+demo: configure
+	cmake --build $(BUILD) -j $(JOBS) --target zoncloud
 	bash scripts/demo.sh $(BUILD)
 
 test: build
@@ -32,8 +35,16 @@ fuzz: setup
 	CXX=clang++ cmake -S . -B build-fuzz -DZON_FUZZ=ON -DCMAKE_BUILD_TYPE=RelWithDebInfo
 	cmake --build build-fuzz -j $(JOBS)
 
+# Each fuzz target for SECONDS with its corpus and a memory cap.
+fuzz-run: fuzz
+	bash scripts/fuzz_run.sh build-fuzz $(SECONDS)
+
 bench: build
 	for b in $(BUILD)/bench_*; do $$b; done
+
+# PREFIX=/usr/local by default.
+install: build
+	cmake --install $(BUILD) $(if $(PREFIX),--prefix $(PREFIX))
 
 clean:
 	rm -rf build build-asan build-tsan build-fuzz

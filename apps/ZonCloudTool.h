@@ -1,13 +1,19 @@
 #pragma once
 #include <array>
+#include <chrono>
+#include <condition_variable>
+#include <cstdint>
 #include <memory>
+#include <mutex>
 #include <optional>
 #include <string>
+#include <thread>
 #include <vector>
 
 #include <CLI/CLI.hpp>
 #include <nlohmann/json.hpp>
 
+#include "ZonCloudReadProgress.h"
 #include "ZonCloudSetting.h"
 #include "ZonError.h"
 #include "ZonICloudReadFile.h"
@@ -62,10 +68,15 @@ struct ZonToolReaderOptions {
     // --format when given, else the format that claims the file's extension
     // (or the text reader that read the file in its place).
     std::string FormatName() const;
+    // When the file's extension is claimed by several formats and no --format
+    // was given, the line that says which one reads it; "" otherwise.
+    std::string ChoiceNote() const;
     // Creates the reader: by --format when given, else by the file's extension.
     ZonICloudReadFile_var CreateReader(std::string& formatName) const;
     // Imports the file through the import entry, as the host would (by --format
-    // when given); the statistics text is the last message.
+    // when given), with a progress bar on a terminal; the statistics text is
+    // the last message. Says on standard error which format was chosen when
+    // several claim the file.
     std::shared_ptr<ZonCldBody> Import(ZonGeoFactoryProtected& geometry, std::vector<ZonString>& messages) const;
 
 private:
@@ -76,6 +87,28 @@ private:
     template <class Attempt>
     auto WithTextFallback(Attempt attempt) const;
     mutable std::string _readAsText;  // the text reader's name, once it read the file
+};
+
+// A progress bar on standard error while the calling thread reads `file`:
+// the bytes read so far against the file's size, redrawn a few times a
+// second once the work has lasted a second; nothing when standard error is
+// not a terminal. Made around one import on the thread that imports.
+class ZonToolProgress {
+public:
+    explicit ZonToolProgress(const std::string& file);
+    ~ZonToolProgress();
+    ZonToolProgress(const ZonToolProgress&) = delete;
+    ZonToolProgress& operator=(const ZonToolProgress&) = delete;
+
+private:
+    void Paint();
+
+    ZonCloudReadProgress _counter;
+    std::uint64_t _size = 0;
+    std::mutex _mutex;
+    std::condition_variable _wake;
+    bool _done = false;
+    std::thread _painter;
 };
 
 // Writes numbers so that they read back to the same float or double.

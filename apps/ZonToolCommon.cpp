@@ -114,8 +114,20 @@ auto ZonToolReaderOptions::WithTextFallback(Attempt attempt) const
     }
 }
 
+std::string ZonToolReaderOptions::ChoiceNote() const
+{
+    if (!format.empty()) return {};
+    const std::vector<ZonUnicodeString> claiming = ZonCldImportServices::FormatsOfFile(ZonUnicodeString(file));
+    if (claiming.size() < 2) return {};
+    std::string others;
+    for (std::size_t i = 1; i < claiming.size(); ++i) others += (i > 1 ? ", " : "") + claiming[i].ToUtf8();
+    return "note: " + ZonCldImportServices::ExtensionOf(ZonUnicodeString(file)).ToUtf8() + " is read as " +
+           claiming.front().ToUtf8() + " (also claimed by " + others + "; choose with --format)";
+}
+
 ZonICloudReadFile_var ZonToolReaderOptions::CreateReader(std::string& formatName) const
 {
+    if (const std::string note = ChoiceNote(); !note.empty()) std::cerr << note << "\n";
     ZonICloudReadFile_var reader = WithTextFallback([&](const std::string& name) {
         ZonCldImporter importer{ZonUnicodeString(name.empty() ? FormatName() : name)};
         if (!importer.GetFactory()) ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Input, "ERR_UnknownExtension");
@@ -170,6 +182,8 @@ std::shared_ptr<ZonCldBody> ZonToolReaderOptions::Import(ZonGeoFactoryProtected&
 {
     const ZonMathTransformation placement;
     const ZonUnicodeString fileName(file);
+    if (const std::string note = ChoiceNote(); !note.empty()) std::cerr << note << "\n";
+    ZonToolProgress progress(file);
     return WithTextFallback([&](const std::string& name) {
         ZonMathTransformation inverse;
         ZonMathBox importBox = HasBox() ? Box() : ZonMathBox();

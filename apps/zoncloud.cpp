@@ -9,6 +9,7 @@
 int main(int argc, char** argv)
 {
     CLI::App app{"zoncloud: point-cloud and mesh files read, inspected and converted"};
+    app.set_version_flag("--version", std::string("zoncloud ") + ZON_VERSION);
     app.require_subcommand(1);
     std::map<CLI::App*, ZonToolRun> runs;
     auto add = [&](ZonToolRun run) { runs[app.get_subcommands({}).back()] = std::move(run); };
@@ -22,6 +23,8 @@ int main(int argc, char** argv)
     } catch (const CLI::CallForHelp& e) {
         return app.exit(e);
     } catch (const CLI::CallForAllHelp& e) {
+        return app.exit(e);
+    } catch (const CLI::CallForVersion& e) {
         return app.exit(e);
     } catch (const CLI::ParseError& e) {
         app.exit(e);

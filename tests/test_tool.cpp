@@ -24,7 +24,7 @@ protected:
     }
     bool HasFormat(const char* name) const
     {
-        const json formats = Json("formats --json");
+        const json formats = Json("formats --json")["readers"];
         return std::any_of(formats.begin(), formats.end(), [name](const json& f) { return f["name"] == name; });
     }
     // Points as the JSON gives them, read back into floats.
@@ -38,9 +38,16 @@ protected:
 };
 
 // The order is the registry's, tested with the registry.
-TEST_F(Tool, FormatsJsonDescribesEveryFactory)
+TEST_F(Tool, FormatsJsonDescribesEveryFactoryAndWriter)
 {
-    const json list = Json("formats --json");
+    const json formats = Json("formats --json");
+    for (const json& writer : formats.at("writers")) {
+        EXPECT_EQ(writer.size(), 4u) << writer.dump();
+        EXPECT_FALSE(writer["extensions"].empty());
+        EXPECT_FALSE(writer["accepts"].empty());
+        EXPECT_NE(writer["display"], "") << writer.dump();
+    }
+    const json list = formats.at("readers");
     ASSERT_TRUE(list.is_array());
     EXPECT_FALSE(list.empty());
     for (const json& format : list) {
@@ -75,6 +82,29 @@ TEST_F(Tool, ExitCodesAndTheErrorJson)
         EXPECT_TRUE(run.out.empty());
         EXPECT_NE(run.err.find("ERR_UnknownExtension"), std::string::npos);
     }
+}
+
+TEST_F(Tool, VersionAndTheNotesOfTheReaderChoice)
+{
+    zontest::ToolRun run = Run("--version");
+    EXPECT_EQ(run.status, 0);
+    EXPECT_EQ(run.out.rfind("zoncloud ", 0), 0u) << run.out;
+
+    // An unknown extension names the known ones, for reading and for writing.
+    run = Run("info " + Quote(Write("a.unknownext", "1 2 3\n")));
+    EXPECT_NE(run.err.find(".asc"), std::string::npos) << run.err;
+    if (!HasFormat("ASCII FREE")) return;
+    run = Run("convert " + Quote(Write("b.asc", "1 2 3\n")) + " " + Quote(Path("b.unknownext")));
+    EXPECT_EQ(run.status, 1);
+    EXPECT_NE(run.err.find(".stl"), std::string::npos) << run.err;
+
+    // ".asc" is claimed by more than one format when the grid reader is built:
+    // the note names the one used; standard error (not a terminal) has nothing else.
+    run = Run("info " + Quote(Path("b.asc")) + " --json");
+    EXPECT_EQ(run.status, 0);
+    if (HasFormat("ArcInfoGrid"))
+        EXPECT_EQ(run.err, "note: .asc is read as ASCII FREE (also claimed by ArcInfoGrid; choose with --format)\n");
+    EXPECT_EQ(Run("info " + Quote(Path("b.asc")) + " --format \"ASCII FREE\"").err, "");
 }
 
 TEST_F(Tool, MeshesEndToEnd)

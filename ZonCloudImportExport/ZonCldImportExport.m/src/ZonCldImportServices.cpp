@@ -1,5 +1,6 @@
 #include "ZonCldImportServices.h"
 
+#include <algorithm>
 #include <charconv>
 
 #include "ZonCldImportEngine.h"
@@ -40,16 +41,46 @@ bool FilterHolds(const ZonString& filter, const std::string& extension)
 }
 }  // namespace
 
-ZonUnicodeString ZonCldImportServices::FindFormatOfFile(const ZonUnicodeString& fileName)
+std::vector<ZonUnicodeString> ZonCldImportServices::FormatsOfFile(const ZonUnicodeString& fileName)
 {
     const std::string extension = ExtensionOf(fileName).ToUtf8();
     ZonListValZonUnicodeString names;
     ZonListValZonString filters;
     ZonCldImporter::GetAvailableFormats(names, filters, true);
+    std::vector<ZonUnicodeString> claiming;
     if (!extension.empty())
         for (std::size_t i = 0; i < names.size(); ++i)
-            if (FilterHolds(filters[i], extension)) return names[i];
-    ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Input, "ERR_UnknownExtension");
+            if (FilterHolds(filters[i], extension)) claiming.push_back(names[i]);
+    return claiming;
+}
+
+ZonUnicodeString ZonCldImportServices::FindFormatOfFile(const ZonUnicodeString& fileName)
+{
+    const std::vector<ZonUnicodeString> claiming = FormatsOfFile(fileName);
+    if (claiming.empty())
+        ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Input, "ERR_UnknownExtension", {KnownExtensions()});
+    return claiming.front();
+}
+
+std::string ZonCldImportServices::KnownExtensions()
+{
+    ZonListValZonUnicodeString names;
+    ZonListValZonString filters;
+    ZonCldImporter::GetAvailableFormats(names, filters, true);
+    std::vector<std::string> extensions;
+    for (const ZonString& filter : filters)
+        for (std::size_t start = 0; start <= filter.size();) {
+            const std::size_t end = std::min(filter.find(';', start), filter.size());
+            const ZonUnicodeString pattern(filter.substr(start, end - start));
+            const std::string lower = pattern.ToLower().ToUtf8();
+            if (lower.size() > 2 && lower.compare(0, 2, "*.") == 0) extensions.push_back(lower.substr(1));
+            start = end + 1;
+        }
+    std::sort(extensions.begin(), extensions.end());
+    extensions.erase(std::unique(extensions.begin(), extensions.end()), extensions.end());
+    std::string list;
+    for (const std::string& extension : extensions) list += (list.empty() ? "" : " ") + extension;
+    return list;
 }
 
 namespace {

@@ -1,5 +1,6 @@
 #pragma once
 #include <memory>
+#include <string>
 #include <vector>
 
 #include "ZonCldExport.h"
@@ -23,8 +24,13 @@ public:
     static ZonUnicodeString ExtensionOf(const ZonUnicodeString& fileName);
     // The name of the first format (in the list order of the importer) whose
     // filter holds "*" followed by the file's extension; raises
-    // "ERR_UnknownExtension" when none does.
+    // "ERR_UnknownExtension", naming the known extensions, when none does.
     static ZonUnicodeString FindFormatOfFile(const ZonUnicodeString& fileName);
+    // Every format whose filter holds the file's extension, in the same order
+    // (the first is the one FindFormatOfFile takes).
+    static std::vector<ZonUnicodeString> FormatsOfFile(const ZonUnicodeString& fileName);
+    // The extensions of every format that can be read, lower-cased, each once: ".asc .stl ...".
+    static std::string KnownExtensions();
 
     static std::shared_ptr<ZonCldBody> BuildCldBodyFromFile(ZonGeoFactoryProtected& factory,
                                                             const ZonUnicodeString& fileName,

@@ -8,6 +8,8 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include "ZonCloudReadProgress.h"
+
 using Tool = ZonCloudReadNLSTool;
 
 void ZonCloudByteSource::Open(const std::string& path)
@@ -16,6 +18,7 @@ void ZonCloudByteSource::Open(const std::string& path)
     errno = 0;
     _file = std::fopen(path.c_str(), "rb");
     if (!_file) Tool::Raise(Tool::Data, nullptr);
+    _progress = ZonCloudReadProgress::Current();
     struct stat info {};
     if (fstat(fileno(_file), &info) != 0) return;
     // A directory opens as a stream on this system; refuse it as the open would elsewhere.
@@ -42,6 +45,7 @@ void ZonCloudByteSource::Close()
     _mapping = nullptr;
     if (_file) std::fclose(_file);
     _file = nullptr;
+    _progress = nullptr;
     _memory = nullptr;
     _size = -1;
     _position = 0;
@@ -84,6 +88,7 @@ std::size_t ZonCloudByteSource::ReadSome(void* buffer, std::size_t count)
         Tool::Raise(Tool::Input, nullptr);
     }
     const std::size_t got = std::fread(buffer, 1, count, _file);
+    if (_progress) _progress->Add(got);
     if (got < count && std::ferror(_file)) {
         if (errno == 0) errno = EIO;
         Tool::Raise(Tool::Input, nullptr);

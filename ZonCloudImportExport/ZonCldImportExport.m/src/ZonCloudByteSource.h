@@ -10,6 +10,8 @@
 #include "ZonCldExport.h"
 #include "ZonCloudReadNLSTool.h"
 
+class ZonCloudReadProgress;
+
 // What every reader reads through: a file, or bytes already in memory (the
 // members of an archive, the fuzz targets), with its size, seek and tell,
 // exact reads, and byte-order loads. Sizes and offsets are 64-bit; a reader
@@ -22,7 +24,8 @@ public:
     ZonCloudByteSource& operator=(const ZonCloudByteSource&) = delete;
 
     // Opens a file read-only; a failure (a directory too) raises type 3 with
-    // the system's message.
+    // the system's message. What is read from it counts in the opening
+    // thread's ZonCloudReadProgress, if any.
     void Open(const std::string& path);
     // Reads from `size` bytes at `data`, which the caller keeps alive.
     void OpenMemory(const void* data, std::size_t size);
@@ -104,6 +107,7 @@ private:
     }
 
     std::FILE* _file = nullptr;
+    ZonCloudReadProgress* _progress = nullptr;  // of the file form
     const unsigned char* _memory = nullptr;
     std::int64_t _size = -1;
     std::uint64_t _position = 0;  // of the memory form

@@ -34,5 +34,8 @@ ZonCloudExporter_var ZonCloudExporter::ForFile(const ZonUnicodeString& fileName)
         for (auto& exporter : GetAll())
             for (const std::string& candidate : exporter->GetExtensions())
                 if (candidate == extension) return exporter;
-    ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Input, "ERR_UnknownExtension");
+    std::string known;
+    for (auto& exporter : GetAll())
+        for (const std::string& candidate : exporter->GetExtensions()) known += (known.empty() ? "" : " ") + candidate;
+    ZonCloudReadNLSTool::Raise(ZonCloudReadNLSTool::Input, "ERR_UnknownExtension", {known});
 }

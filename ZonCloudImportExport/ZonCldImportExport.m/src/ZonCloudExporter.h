@@ -55,7 +55,7 @@ public:
     // Every registered exporter, by registry name.
     static std::vector<std::shared_ptr<ZonCloudExporter>> GetAll();
     // The exporter whose filter holds the file's extension (compared in lower
-    // case); raises ERR_UnknownExtension when there is none.
+    // case); raises ERR_UnknownExtension, naming the extensions written, when there is none.
     static std::shared_ptr<ZonCloudExporter> ForFile(const ZonUnicodeString& fileName);
 
 private:
