@@ -36,5 +36,5 @@ step info samples/panel.surf
 
 # A terrain tile: heights as a mesh, written as STL and read back.
 step info samples/N46E007.hgt
-step convert samples/N46E007.hgt "$out/terrain.stl" --binary
+step convert samples/N46E007.hgt "$out/terrain.stl"
 step info "$out/terrain.stl"

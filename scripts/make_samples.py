@@ -1,11 +1,10 @@
 #!/usr/bin/env python3
 """Writes the demo's small samples beside samples/scans.asc (see
 make_sample_scans.py):
-  samples/knob.stl      a binary STL mesh: a closed, rounded knob of 960 triangles
+  samples/knob.stl      a binary STL mesh: a closed, rounded knob of 900 triangles
   samples/panel.surf    a fringe-projection measurement: one 48 x 32 raster patch
                         of a gently curved panel, with a few unmeasured pixels
   samples/N46E007.hgt   a terrain tile: 121 x 121 big-endian heights of two hills
-                        and a void
 """
 import math
 import os
@@ -70,7 +69,7 @@ def tile(path, side=121):
         for c in range(side):
             h = 900 + 600 * math.exp(-((c - 40) ** 2 + (r - 50) ** 2) / 400.0)
             h += 350 * math.exp(-((c - 85) ** 2 + (r - 80) ** 2) / 250.0)
-            heights.append(-32768 if (c - 100) ** 2 + (r - 20) ** 2 < 16 else int(h))
+            heights.append(int(h))
     with open(path, "wb") as out:
         out.write(struct.pack(">%dh" % len(heights), *heights))
 

@@ -13,7 +13,12 @@ namespace zontest {
 
 inline std::string CorpusFile(const std::string& target, const std::string& file)
 {
-    return Slurp(std::string(ZON_TEST_DATA_DIR) + "/../../fuzz/corpus/" + target + "/" + file);
+    // tests/data may not exist, so the path is cut rather than walked up.
+    const std::string data = ZON_TEST_DATA_DIR;
+    const std::string corpus = data.substr(0, data.rfind("/tests/data")) + "/fuzz/corpus/";
+    const std::string bytes = Slurp(corpus + target + "/" + file);
+    EXPECT_FALSE(bytes.empty()) << corpus + target + "/" + file;
+    return bytes;
 }
 
 struct ReaderFixture {

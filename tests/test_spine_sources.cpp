@@ -14,6 +14,7 @@
 #include "ZonCloudReadAsciiLibre.h"
 #include "ZonCloudReadCgoAscii.h"
 #include "ZonCloudReadLeica.h"
+#include "ZonCloudReadProgress.h"
 #include "ZonCloudReadStl.h"
 #include "ZonCloudSubMesh.h"
 #include "ZonTestFiles.h"
@@ -50,6 +51,29 @@ TEST_F(SourcesTest, FileAndMemoryGiveTheSameBytesSizeAndPositions)
         source->Seek(100);  // past the end: nothing to read, no error until an exact read
         EXPECT_EQ(source->ReadSome(rest, 1), 0u);
     }
+}
+
+// Progress counts what the file sources of its thread read, while it lives;
+// memory sources and sources opened outside it count nowhere.
+TEST_F(SourcesTest, ProgressCountsFileBytesReadInItsScope)
+{
+    const std::string path = Write("cloud.asc", Repeat("1 2 3\n", 1000));
+    ZonCloudByteSource before;
+    before.Open(path);
+    ZonCloudReadProgress outer;
+    {
+        ZonCloudReadProgress inner;
+        ZonCloudReadAsciiLibre reader{ZonUnicodeString(path)};
+        EXPECT_EQ(reader.GetNumberOfPoints(), 1000);
+        EXPECT_GE(inner.BytesRead(), 6000u);
+        EXPECT_LE(inner.BytesRead(), 2 * 6000u);  // at most a second pass
+        char byte = 0;
+        before.Read(&byte, 1);
+        memory_.OpenMemory("abc", 3);
+        memory_.Read(&byte, 1);
+    }
+    EXPECT_EQ(outer.BytesRead(), 0u);
+    EXPECT_EQ(ZonCloudReadProgress::Current(), &outer);
 }
 
 TEST(ByteSource, LoadsOfEachWidthAndOrder)

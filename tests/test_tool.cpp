@@ -102,8 +102,9 @@ TEST_F(Tool, VersionAndTheNotesOfTheReaderChoice)
     // the note names the one used; standard error (not a terminal) has nothing else.
     run = Run("info " + Quote(Path("b.asc")) + " --json");
     EXPECT_EQ(run.status, 0);
-    if (HasFormat("ArcInfoGrid"))
+    if (HasFormat("ArcInfoGrid")) {
         EXPECT_EQ(run.err, "note: .asc is read as ASCII FREE (also claimed by ArcInfoGrid; choose with --format)\n");
+    }
     EXPECT_EQ(Run("info " + Quote(Path("b.asc")) + " --format \"ASCII FREE\"").err, "");
 }
 
