@@ -3,6 +3,7 @@
 #include <cstddef>
 #include <cstdint>
 #include <cstdio>
+#include <cstdlib>
 #include <string>
 #include <unistd.h>
 
@@ -31,6 +32,9 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
     if (size > 1 << 16) return 0;
     // The FDF can only be named by a path; the data is read from memory.
     static const std::string fdfPath = TempPath("columns.fdf");
+    // Removed at exit, so that replaying the corpus in every build leaves nothing behind.
+    static const int removal = std::atexit([] { std::remove(fdfPath.c_str()); });
+    (void)removal;
     std::size_t cut = 0;
     while (cut < size && data[cut] != '\n') ++cut;
     const std::size_t fdfSize = cut < size ? cut + 1 : size;
