@@ -63,13 +63,16 @@ std::string HugeDicomSlice()
     return slice;
 }
 
-// An archive whose every member declares 4 GB once inflated (local and central headers).
-std::string HugeZipMembers()
+// An archive whose every member declares `size` bytes once inflated and, when
+// `compressed`, about as many compressed (local and central headers).
+std::string HugeZipMembers(std::uint32_t size, bool compressed)
 {
     std::string zip = CorpusFile("fuzz_dicom", "series.dcz");
-    for (const auto& [signature, field] : {std::pair<std::string, std::size_t>{"PK\x03\x04", 22}, {"PK\x01\x02", 24}})
-        for (auto at = zip.find(signature); at != std::string::npos; at = zip.find(signature, at + 4))
-            zip = Set32(zip, at + field, 0xFFFFFFF0u);
+    for (const auto& [signature, field] : {std::pair<std::string, std::size_t>{"PK\x03\x04", 18}, {"PK\x01\x02", 20}})
+        for (auto at = zip.find(signature); at != std::string::npos; at = zip.find(signature, at + 4)) {
+            if (compressed) zip = Set32(zip, at + field, size - 200);
+            zip = Set32(zip, at + field + 4, size);
+        }
     return zip;
 }
 
@@ -132,7 +135,8 @@ std::vector<Hostile> HostileFiles()
                               zontest::SteinSubset::Scans, std::string(8, '\0')}}), Read + "ERR_UnknownData"},
         {"IGES copious count", "a.igs", IgesWithHugeCopiousCount(), "ok"},
         {"DICOM rows and columns", "a.dcm", HugeDicomSlice(), Read + "ERR_DicomShortPixelData"},
-        {"DICOM archive member sizes", "a.dcz", HugeZipMembers(), "ZonZipReader.ERR_TooLarge"},
+        {"DICOM archive member sizes", "a.dcz", HugeZipMembers(0xFFFFFFF0u, false), "ZonZipReader.ERR_TooLarge"},
+        {"DICOM archive compressed sizes", "b.dcz", HugeZipMembers(0x7FFFFFF0u, true), "ZonZipReader.ERR_TooLarge"},
         {"ArcInfo rows and columns", "a.asc_grid", "ncols 100000\nnrows 100000\nxllcorner 0\nyllcorner 0\ncellsize 1\n1 2 3\n", "ZonCloudOperErrorTool.ERR_ENODATA"},
         {"DEM profile count", "a.dem",
          Patched(CorpusFile("fuzz_dem", "gdal_4x3.dem"), "1.000000D+00     1     4", "1.000000D+00     1999999"), "ok"},

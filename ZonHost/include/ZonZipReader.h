@@ -12,8 +12,9 @@ struct zip;
 // in memory) and extracts one member into memory. Nothing is written to disk.
 // Failures raise ZonCloudOperErrors of the catalog "ZonCldResOperError" with
 // "ZonZipReader." keys. A member whose declared size the archive cannot
-// justify (more than deflate can expand its compressed bytes to, or more
-// than the caller's limit) is refused before anything is allocated, and a
+// justify (more than deflate can expand its compressed bytes to, counting no
+// more compressed bytes than the archive holds, or more than the caller's
+// limit) is refused before anything is allocated, and a
 // member that inflates beyond its declared size is refused while it is read.
 class ZON_HOST_API ZonZipReader {
 public:
@@ -45,5 +46,6 @@ private:
     void Browse();
 
     zip* _archive = nullptr;
+    std::uint64_t _archiveSize = UINT64_MAX;  // in bytes; unknown: no bound
     std::vector<Member> _members;
 };

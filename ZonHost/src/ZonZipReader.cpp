@@ -2,6 +2,8 @@
 
 #include <zip.h>
 
+#include <algorithm>
+#include <filesystem>
 #include <new>
 
 #include "ZonCloudOperErrorTool.h"
@@ -43,10 +45,13 @@ ZonZipReader::ZonZipReader(const std::string& path)
     int code = 0;
     _archive = zip_open(path.c_str(), ZIP_RDONLY, &code);
     if (!_archive) Raise("ERR_Open", ErrorText(code));
+    std::error_code sizeError;
+    const auto size = std::filesystem::file_size(path, sizeError);
+    if (!sizeError) _archiveSize = static_cast<std::uint64_t>(size);
     Browse();
 }
 
-ZonZipReader::ZonZipReader(const void* data, std::size_t size)
+ZonZipReader::ZonZipReader(const void* data, std::size_t size) : _archiveSize(size)
 {
     zip_error_t error;
     zip_error_init(&error);
@@ -100,10 +105,12 @@ void ZonZipReader::Browse()
 
 std::vector<unsigned char> ZonZipReader::Extract(const Member& member, std::uint64_t limit) const
 {
-    // Stored members hold their size; deflated ones expand at most MaxDeflateRatio times.
+    // Stored members hold their size; deflated ones expand at most
+    // MaxDeflateRatio times. The central directory's compressed size is the
+    // archive's word too: no member holds more bytes than the whole archive.
+    const std::uint64_t compressed = std::min(member.compressedSize, _archiveSize);
     const std::uint64_t justified =
-        member.compressedSize > (UINT64_MAX - 64) / MaxDeflateRatio ? UINT64_MAX
-                                                                     : member.compressedSize * MaxDeflateRatio + 64;
+        compressed > (UINT64_MAX - 64) / MaxDeflateRatio ? UINT64_MAX : compressed * MaxDeflateRatio + 64;
     if (member.size > limit || member.size > justified) Raise("ERR_TooLarge", member.name);
 
     MemberFile file{zip_fopen_index(_archive, member.index, 0)};
