@@ -58,6 +58,10 @@ inline std::vector<ReaderFixture> EveryReaderFixture()
         {"ArcInfo grid", "six.asc_grid", seed("fuzz_arcinfo_grid", "six_lines.asc")},
         {"DEM", "gdal_4x3.dem", seed("fuzz_dem", "gdal_4x3.dem")},
         {"SRTM", "ten.hgt", seed("fuzz_srtm", "ten.hgt")},
+        {"Hyscan", "groups.hym", seed("fuzz_hyscan", "xyz_two_groups")},
+        {"Kreon planar", "planar.grk", seed("fuzz_kreon", "planar")},
+        {"Kreon cylinder", "cylinder.grk", seed("fuzz_kreon", "cylinder_centres")},
+        {"Opton", "grid.xyz", seed("fuzz_opton", "two_by_three")},
     };
 }
 

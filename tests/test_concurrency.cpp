@@ -66,6 +66,8 @@ TEST_F(Concurrency, EveryFormatOnFourThreadsGivesTheOneThreadResult)
     std::vector<std::string> files;
     std::map<std::string, std::string> expected;
     for (const auto& fixture : zontest::EveryReaderFixture()) {
+        // A build of some readers only (the thread-sanitizer build) runs the rows it has.
+        if (ZonCldImportServices::FormatsOfFile(ZonUnicodeString(fixture.fileName)).empty()) continue;
         const std::string path = Write(fixture.fileName, fixture.bytes());
         const std::string summary = Summary(path);
         ASSERT_NE(summary.rfind("error", 0), 0u) << fixture.reader << ": " << summary;
@@ -73,6 +75,7 @@ TEST_F(Concurrency, EveryFormatOnFourThreadsGivesTheOneThreadResult)
         expected[path] = summary;
     }
 
+    ASSERT_FALSE(files.empty());
     constexpr int Threads = 4, Rounds = 8;
     std::vector<std::vector<std::string>> differences(Threads);
     std::vector<std::thread> threads;

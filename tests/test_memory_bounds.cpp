@@ -13,6 +13,7 @@
 #include <cstring>
 #include <fstream>
 
+#include "RangeScannerFiles.h"
 #include "ScannerFiles.h"
 #include "ZonCldBody.h"
 #include "ZonCldImportServices.h"
@@ -101,6 +102,30 @@ std::string AtosPatch(std::size_t descriptorField, std::uint32_t value)
     return descriptorField == 0 ? Set32(bytes, 16, value) : Set32(bytes, 512 + descriptorField, value);
 }
 
+// One group of one profile; `field` (from the file's start) set to `value` when not 0.
+std::string HyscanWith(std::uint32_t points, std::size_t field = 0, std::uint32_t value = 0)
+{
+    const std::string bytes = zontest::HyscanFile({{{points, {1, 2, 3, 4, 5, 6}}}});
+    return field == 0 ? bytes : Set32(bytes, field, value);
+}
+
+std::string KreonHuge()
+{
+    zontest::KreonGrid grid;
+    grid.columns = grid.rows = 0xFFFF;
+    grid.values = {1, 2, 3, 4};
+    return zontest::KreonFile(grid);
+}
+
+std::string OptonHuge(float points)
+{
+    zontest::OptonGrid grid;
+    grid.rows = grid.columns = 1e6f;
+    grid.points = points;
+    grid.records = {{1, 2, 3, 0}, {4, 5, 6, 0}};
+    return zontest::OptonFile(grid);
+}
+
 struct Hostile {
     const char* reader;
     std::string fileName;
@@ -141,6 +166,11 @@ std::vector<Hostile> HostileFiles()
         {"DEM profile count", "a.dem",
          Patched(CorpusFile("fuzz_dem", "gdal_4x3.dem"), "1.000000D+00     1     4", "1.000000D+00     1999999"), "ok"},
         {"SRTM odd size", "a.hgt", std::string(3, '\0'), "ok"},
+        {"Hyscan profile points", "a.hym", HyscanWith(0xFFFFFFFFu), "ZonCloudOperErrorTool.ERR_ENODATA"},
+        {"Hyscan group profiles", "b.hym", HyscanWith(2, 96 + 94, 0xFFFFFFFFu), "ZonCloudOperErrorTool.ERR_ENODATA"},
+        {"Kreon rows and columns", "a.grk", KreonHuge(), "ZonCloudOperErrorTool.ERR_ENODATA"},
+        {"Opton rows and columns", "a.xyz", OptonHuge(-1), Read + "ERR_UnknownData"},
+        {"Opton point count", "b.xyz", OptonHuge(4e9f), Read + "ERR_UnknownData"},
     };
 }
 

@@ -9,6 +9,7 @@
 #include <limits>
 
 #include "ZonCloudByteSource.h"
+#include "ZonCloudChunkedText.h"
 #include "ZonCloudLineSource.h"
 #include "ZonCloudPolygonCursor.h"
 #include "ZonCloudReadAsciiLibre.h"
@@ -74,6 +75,14 @@ TEST_F(SourcesTest, ProgressCountsFileBytesReadInItsScope)
     }
     EXPECT_EQ(outer.BytesRead(), 0u);
     EXPECT_EQ(ZonCloudReadProgress::Current(), &outer);
+
+    // The chunked path reads the mapped file: its stitched parts count.
+    ZonCloudChunkedText::SetThreshold(1);
+    ZonCloudReadAsciiLibre mapped{ZonUnicodeString(path)};
+    EXPECT_EQ(mapped.GetNumberOfPoints(), 1000);
+    ZonCloudChunkedText::SetThreshold(0);
+    EXPECT_GE(outer.BytesRead(), 6000u);
+    EXPECT_LE(outer.BytesRead(), 2 * 6000u);
 }
 
 TEST(ByteSource, LoadsOfEachWidthAndOrder)

@@ -135,6 +135,8 @@ void ZonCloudByteSource::Unneeded(std::uint64_t offset, std::uint64_t count)
 {
     if (!_mapping || _size <= 0) return;
     const auto size = static_cast<std::uint64_t>(_size);
+    // A mapped file is read by the parts it gives back: they count as read.
+    if (_progress && offset < size) _progress->Add(std::min(count, size - offset));
     const std::uint64_t page = static_cast<std::uint64_t>(sysconf(_SC_PAGESIZE));
     // Whole pages inside the range only: the neighbours may still be read.
     const std::uint64_t first = (offset + page - 1) / page * page;

@@ -49,7 +49,8 @@ public:
     // (kept until Close), or the bytes of a memory source. Null when the
     // source cannot be mapped (no size, empty, a special file); the caller
     // then reads it. Parts already used may be given back with Unneeded, so
-    // that a big file does not stay resident while it is read.
+    // that a big file does not stay resident while it is read; they count as
+    // read for the source's ZonCloudReadProgress.
     const unsigned char* Map();
     void Unneeded(std::uint64_t offset, std::uint64_t count);
 

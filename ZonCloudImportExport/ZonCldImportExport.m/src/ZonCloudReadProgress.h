@@ -7,8 +7,9 @@
 // Bytes of files read so far by the readers of one thread, for a front end
 // that shows progress while one long import call runs. Created on the thread
 // that imports, it counts what every byte source opened on that thread reads
-// from its file (not from memory); another thread may read BytesRead at any
-// time. Scopes nest: the innermost one counts. A source keeps the counter it
+// from its file (not from memory), by reads or by mapped parts given back
+// once used, whichever thread does it; another thread may read BytesRead at
+// any time. Scopes nest: the innermost one counts. A source keeps the counter it
 // found when it opened, so the counter outlives the readers made in its scope.
 class ZON_CLD_API ZonCloudReadProgress {
 public:
