@@ -66,6 +66,9 @@ protected:
     {
         arrays.Add(_points);
         arrays.Add(_pointsDouble);
+        // Every point kept while counting is the answer itself at 100 %.
+        arrays.Add(_keptPoints);
+        arrays.Add(_keptPointsDouble);
     }
     void AnalyseFile() override;
 

@@ -14,6 +14,7 @@
 #include "ZonCloudScanFormat.h"
 #include "ZonCloudLineSource.h"
 #include "ZonCloudVertexTable.h"
+#include "ZonCloudWorkerPool.h"
 
 namespace {
 
@@ -549,6 +550,11 @@ struct CornerChunk {
     std::vector<std::uint32_t> hashes;
     std::vector<std::uint32_t> failures;  // text: corners parsed before each vertex line that failed
     BoxAccumulator<float> box;            // binary: the box of the chunk's corners
+    // Binary: the chunk's own distinct corners in order of first appearance,
+    // their hashes, and each corner's number among them.
+    std::vector<T> distinct;
+    std::vector<std::uint32_t> distinctHashes;
+    std::vector<std::uint32_t> local;
 };
 
 }  // namespace
@@ -650,14 +656,19 @@ void ZonCloudReadStl::AnalyseBinaryInChunks(const unsigned char* mapped, std::ui
     _vertices = {};
     _triangles = {};
     Reserve(_vertices, 3 * expected);
-    Reserve(_triangles, 3 * static_cast<std::size_t>(records));
     ZonCloudVertexTable<float> table(_vertices, expected);
     BoxAccumulator<float> box;
     const bool native = _nativeOrder;
 
+    // Each chunk first merges its own corners on a worker, so the stitch looks
+    // up only the chunk's distinct corners, in their order of first appearance:
+    // the numbering is the one a single pass over every corner gives.
     const auto parse = [native](const unsigned char* record, std::size_t count, CornerChunk<float>& chunk) {
         chunk.corners.resize(9 * count);
-        chunk.hashes.resize(3 * count);
+        chunk.local.resize(3 * count);
+        chunk.distinct.clear();
+        chunk.distinctHashes.clear();
+        ZonCloudVertexTable<float> own(chunk.distinct, 3 * count / 4 + 16);
         for (std::size_t r = 0; r < count; ++r, record += kRecordSize) {
             float* corners = chunk.corners.data() + 9 * r;
             if (native)
@@ -665,21 +676,44 @@ void ZonCloudReadStl::AnalyseBinaryInChunks(const unsigned char* mapped, std::ui
             else
                 LoadCorners<true>(record, corners);
             for (int k = 0; k < 3; ++k) {
-                chunk.box.Add(corners + 3 * k);
-                chunk.hashes[3 * r + static_cast<std::size_t>(k)] = ZonCloudVertexTable<float>::HashOf(corners + 3 * k);
+                const float* corner = corners + 3 * k;
+                chunk.box.Add(corner);
+                const std::uint32_t hash = ZonCloudVertexTable<float>::HashOf(corner);
+                const std::uint32_t number = own.Index(corner, hash);
+                if (number == chunk.distinctHashes.size()) chunk.distinctHashes.push_back(hash);
+                chunk.local[3 * r + static_cast<std::size_t>(k)] = number;
             }
         }
     };
+    // The stitch numbers each chunk's distinct corners; the corners themselves
+    // are numbered afterwards, chunk by chunk on the workers.
+    struct Numbered {
+        std::vector<std::uint32_t> local, global;
+    };
+    std::vector<Numbered> numbered;
     const auto stitch = [&](CornerChunk<float>& chunk) {
         box.Merge(chunk.box);
-        const std::size_t corners = chunk.hashes.size();
-        for (std::size_t i = 0; i < corners; ++i) {
-            if (i + kAhead < corners) table.Prefetch(chunk.hashes[i + kAhead]);
-            _triangles.push_back(table.Index(chunk.corners.data() + 3 * i, chunk.hashes[i]));
+        const std::size_t distinct = chunk.distinctHashes.size();
+        Numbered& n = numbered.emplace_back();
+        n.global.resize(distinct);
+        for (std::size_t i = 0; i < distinct; ++i) {
+            if (i + kAhead < distinct) table.Prefetch(chunk.distinctHashes[i + kAhead]);
+            n.global[i] = table.Index(chunk.distinct.data() + 3 * i, chunk.distinctHashes[i]);
         }
+        n.local = std::move(chunk.local);
+        chunk.local = {};
         return true;
     };
     ZonCloudChunkedText::RunRecords<CornerChunk<float>>(_source, mapped, 84, records, kRecordSize, parse, stitch);
+    std::vector<std::size_t> starts(numbered.size() + 1, 0);
+    for (std::size_t c = 0; c < numbered.size(); ++c) starts[c + 1] = starts[c] + numbered[c].local.size();
+    Resize(_triangles, starts.back());
+    ZonCloudWorkerPool::Run(numbered.size(), [&](std::size_t c) {
+        std::uint32_t* out = _triangles.data() + starts[c];
+        for (const std::uint32_t number : numbered[c].local) *out++ = numbered[c].global[number];
+        numbered[c] = {};
+    });
+    numbered = {};
 
     _triangleCount = static_cast<std::uint32_t>(records);
     _vertexCount = 3 * _triangleCount;
