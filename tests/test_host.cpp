@@ -3,6 +3,7 @@
 
 #include <cmath>
 #include <limits>
+#include <random>
 
 #include "ZonCldPointArray.h"
 #include "ZonCldSettings.h"
@@ -79,6 +80,36 @@ TEST(HostMath, PointArrayBoxSkipsPointsThatAreNotFinite)
                 EXPECT_TRUE(box.IsSameAs(ZonMathBox(first, last, -last, -first, 0.5 * first, 0.5 * last)))
                     << count << " points, point " << odd;
             }
+        }
+    }
+}
+
+// Flags in every pattern over groups of points, against a plain walk: a
+// point whose flag is clear never widens the box, however far out it lies.
+TEST(HostMath, PointArrayBoxFollowsTheFlagsOfEveryPoint)
+{
+    std::mt19937 random(5);
+    for (int round = 0; round < 200; ++round) {
+        const std::size_t count = 1 + random() % 40;
+        std::vector<float> xyz;
+        std::vector<unsigned char> flags;
+        ZonMathBox expected;
+        for (std::size_t i = 0; i < count; ++i) {
+            const bool kept = random() % 3 != 0;
+            const float scale = kept ? 1.0f : 1e6f;
+            const float p[3] = {scale * float(int(random() % 201) - 100), scale * float(int(random() % 201) - 100),
+                                scale * float(int(random() % 201) - 100)};
+            xyz.insert(xyz.end(), p, p + 3);
+            flags.push_back(kept ? static_cast<unsigned char>(1 + random() % 255) : 0);
+            if (kept) expected.AddPoint(p[0], p[1], p[2]);
+        }
+        ZonCldPointArray points;
+        points.AdoptScaled(std::move(xyz), 1.0);
+        ZonMathBox box;
+        points.AddToBox(box, flags.data());
+        EXPECT_EQ(box.IsEmpty(), expected.IsEmpty()) << "round " << round;
+        if (!expected.IsEmpty()) {
+            EXPECT_TRUE(box.IsSameAs(expected)) << "round " << round;
         }
     }
 }

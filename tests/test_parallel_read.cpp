@@ -10,11 +10,15 @@
 #include <string>
 #include <vector>
 
+#include "RangeScannerFiles.h"
+#include "ZonCldImportEngine.h"
 #include "ZonCloudChunkedText.h"
 #include "ZonCloudReadAsciiLibre.h"
 #include "ZonCloudReadAsciiUserFormat.h"
 #include "ZonCloudReadCgoAscii.h"
+#include "ZonCloudReadKreonBin.h"
 #include "ZonCloudReadLeica.h"
+#include "ZonCloudReadOptonBin.h"
 #include "ZonCloudReadStl.h"
 #include "ZonCloudWorkerPool.h"
 #include "ZonError.h"
@@ -385,6 +389,81 @@ TEST_F(ParallelRead, BinaryStlMergesInOneMappedPass)
                               ReadStl);
     const std::vector<float> flat(9 * 50, 1.0f);
     ExpectSameAnswers("flat.stl", binary(flat, 50, false, 0), ReadStl);
+}
+
+// Rows and validity of every grid row, as bytes.
+std::string GridRows(ZonICloudReadGridFile& grids)
+{
+    Record out;
+    grids.BeginGetGrid();
+    while (grids.NextGrid()) {
+        grids.BeginGetGridPoints();
+        unsigned n = 0;
+        const unsigned char* valid = nullptr;
+        while (const float* points = grids.GetGridPoints(n, valid)) {
+            out.Values("row", points, 3 * std::size_t{n});
+            out.Values("valid", valid, n);
+        }
+    }
+    return out.Bytes();
+}
+
+std::string GridRows(const ZonCldBody& body)
+{
+    Record out;
+    for (const auto& set : body.GetSetsOfGrids())
+        for (const auto& grid : set->GetGrids())
+            for (const ZonCldGrid::Row& row : grid->GetRows()) {
+                std::vector<float> points;
+                for (std::size_t i = 0; i < row.points.GetNumberOfPoints(); ++i)
+                    for (int a = 0; a < 3; ++a) points.push_back(static_cast<float>(row.points.GetPoint(i)[a]));
+                out.Values("row", points.data(), points.size());
+                out.Values("valid", row.valid.data(), row.valid.size());
+            }
+    return out.Bytes();
+}
+
+// Range grids large enough for several batches of rows: the rows built on
+// the workers are those of one thread, an import takes each over and holds
+// the same rows, and a walk after it builds them again.
+TEST_F(ParallelRead, GridRowsBuiltInBatchesAndTakenOverByTheImport)
+{
+    zontest::KreonGrid kreon;
+    kreon.columns = 700;
+    kreon.rows = 1700;  // 4.8 MB of values
+    zontest::OptonGrid opton;
+    opton.rows = 800;
+    opton.columns = 400;  // 5.1 MB of records
+    for (int i = 0; i < 700 * 1700; ++i) kreon.values.push_back(Pick(10) == 0 ? -32767.0f : static_cast<float>(Pick(1000)) / 7);
+    for (int i = 0; i < 800 * 400; ++i)
+        opton.records.push_back({static_cast<float>(i % 400), static_cast<float>(i / 400), static_cast<float>(Pick(100)),
+                                 Pick(10) == 0 ? -1.0f : 0.0f});
+    const std::vector<std::string> paths = {Write("g.grk", zontest::KreonFile(kreon)), Write("g.xyz", zontest::OptonFile(opton))};
+    const auto open = [&](std::size_t i) -> std::shared_ptr<ZonCloudReadFile> {
+        if (i == 0) return std::make_shared<ZonCloudReadKreonBin>(paths[0]);
+        return std::make_shared<ZonCloudReadOptonBin>(paths[1]);
+    };
+    for (std::size_t i = 0; i < paths.size(); ++i)
+        for (const float percent : {100.0f, 30.0f}) {
+            ZonCloudWorkerPool::SetThreadCount(1);
+            auto reader = open(i);
+            reader->SetSamplingPercent(percent);
+            const std::string reference = GridRows(dynamic_cast<ZonICloudReadGridFile&>(*reader));
+            ZonCloudWorkerPool::SetThreadCount(3);
+            reader = open(i);
+            reader->SetSamplingPercent(percent);
+            auto& grids = dynamic_cast<ZonICloudReadGridFile&>(*reader);
+            EXPECT_EQ(GridRows(grids), reference) << paths[i] << " at " << percent << " %";
+
+            ZonGeoFactoryProtected factory;
+            const ZonCldBody_var body = factory.CreateCldBody();
+            std::vector<std::string> messages;
+            std::string statistics;
+            ZonCldImportEngine::InsertFile(*body, factory, reader, false, ZonICkeUnit::FromName("mm"), ZonMathBox(), 1.0,
+                                           messages, statistics, true);
+            EXPECT_EQ(GridRows(*body), reference) << paths[i] << " at " << percent << " %";
+            EXPECT_EQ(GridRows(grids), reference) << paths[i] << " walked after the import";
+        }
 }
 
 }  // namespace

@@ -13,7 +13,8 @@
 // an array the reader owns that holds exactly `count` values, and answers
 // true; otherwise it changes nothing and answers false. The reader then no
 // longer holds those values: the answer that gave `data` must not be asked
-// for again, so an importer hands over only what it reads last.
+// for again, so an importer hands over only what it reads last, or a grid
+// row once it has it (a walk never asks for a row twice).
 class ZON_CLD_API ZonICloudReadHandOver {
 public:
     virtual ~ZonICloudReadHandOver() = default;

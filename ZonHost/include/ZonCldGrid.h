@@ -15,6 +15,9 @@ public:
     };
     // Adds a row; a null validity means every point is valid.
     Row& AddRow(const unsigned char* valid, std::size_t count);
+    // Adds a row whose validity bytes are taken as they are (any non-zero
+    // byte a valid point).
+    Row& AddRow(std::vector<unsigned char>&& valid);
     const std::vector<Row>& GetRows() const { return _rows; }
     std::size_t GetNumberOfRows() const { return _rows.size(); }
     // Points with their validity set (counted as rows are added: the

@@ -21,3 +21,16 @@ ZonCldGrid::Row& ZonCldGrid::AddRow(const unsigned char* valid, std::size_t coun
     }
     return row;
 }
+
+ZonCldGrid::Row& ZonCldGrid::AddRow(std::vector<unsigned char>&& valid)
+{
+    Row& row = _rows.emplace_back();
+    row.valid = std::move(valid);
+    std::size_t validCount = 0;
+    for (unsigned char& v : row.valid) {
+        v = v ? 1 : 0;
+        validCount += v;
+    }
+    _validPoints += validCount;
+    return row;
+}

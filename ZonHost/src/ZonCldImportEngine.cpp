@@ -244,8 +244,16 @@ private:
             const T* points = GridPoints<T>(grids, count, valid);
             if (!points) return;
             if (count == 0) continue;
-            ZonCldGrid::Row& row = grid.AddRow(valid, count);
-            row.points.AssignScaled(points, count, _factor);
+            // A reader that builds each row in arrays of its own gives them
+            // away: the row is never asked for again in this walk.
+            std::vector<unsigned char> takenValid;
+            std::vector<T> taken;
+            const bool own = _handOver && valid && _handOver->HandOver(valid, count, takenValid);
+            ZonCldGrid::Row& row = own ? grid.AddRow(std::move(takenValid)) : grid.AddRow(valid, count);
+            if (own && _handOver->HandOver(points, 3 * static_cast<std::size_t>(count), taken))
+                row.points.AdoptScaled(std::move(taken), _factor);
+            else
+                row.points.AssignScaled(points, count, _factor);
         }
     }
 

@@ -2,8 +2,12 @@
 
 #include <algorithm>
 #include <cmath>
+#include <cstdint>
 #include <limits>
 #include <type_traits>
+#ifdef __SSE2__
+#include <emmintrin.h>
+#endif
 
 namespace {
 template <class To, class From>
@@ -46,18 +50,20 @@ bool FastTriplesBox(const T* p, const unsigned char* flags, std::size_t n, T low
         hi[j] = -Infinity;
         odd[j] = 0;
     }
-    const auto take = [&](std::size_t i, std::size_t j) {
-        const T v = p[i];
+    // Point k of a group of four fills lanes 3k to 3k + 2, so a lane's flag
+    // is a fixed one of the group's four.
+    const auto take = [&](const T* q, const unsigned char* f, std::size_t j) {
+        const T v = q[j];
         bool keep = true;
-        if constexpr (Flagged) keep = flags[i / 3] != 0;
+        if constexpr (Flagged) keep = f[j / 3] != 0;
         lo[j] = keep && v < lo[j] ? v : lo[j];
         hi[j] = keep && v > hi[j] ? v : hi[j];
         odd[j] += keep ? v - v : T(0);
     };
-    const std::size_t values = 3 * n, whole = values / Lanes * Lanes;
-    for (std::size_t i = 0; i < whole; i += Lanes)
-        for (std::size_t j = 0; j < Lanes; ++j) take(i + j, j);
-    for (std::size_t i = whole; i < values; ++i) take(i, i - whole);
+    const std::size_t whole = n / 4 * 4;
+    for (std::size_t k = 0; k < whole; k += 4)
+        for (std::size_t j = 0; j < Lanes; ++j) take(p + 3 * k, Flagged ? flags + k : nullptr, j);
+    for (std::size_t j = 0; j < 3 * (n - whole); ++j) take(p + 3 * whole, Flagged ? flags + whole : nullptr, j);
     for (std::size_t j = 0; j < Lanes; ++j)
         if (odd[j] != 0) return false;
     for (std::size_t j = 0; j < Lanes; ++j) {
@@ -66,6 +72,94 @@ bool FastTriplesBox(const T* p, const unsigned char* flags, std::size_t n, T low
     }
     return true;
 }
+
+#ifdef __SSE2__
+// The same for floats in explicit vector steps (the compiler does not turn
+// the lanes above into vector code at our optimisation level): four points
+// are three vectors, x0 y0 z0 x1 | y1 z1 x2 y2 | z2 x3 y3 z3.
+// Lane masks of a group of four points for each pattern of their flags (bit
+// k set: point k kept); point k fills lanes 3k to 3k + 2 of the group.
+struct LaneMasks {
+    __m128 lanes[16][3];
+    LaneMasks()
+    {
+        for (unsigned pattern = 0; pattern < 16; ++pattern) {
+            alignas(16) std::int32_t bits[12];
+            for (int lane = 0; lane < 12; ++lane) bits[lane] = (pattern >> (lane / 3)) & 1 ? -1 : 0;
+            for (int i = 0; i < 3; ++i)
+                lanes[pattern][i] = _mm_castsi128_ps(_mm_load_si128(reinterpret_cast<const __m128i*>(bits + 4 * i)));
+        }
+    }
+};
+const LaneMasks& Masks()
+{
+    static const LaneMasks masks;
+    return masks;
+}
+
+template <bool Flagged>
+bool FastTriplesBox(const float* p, const unsigned char* flags, std::size_t n, float low[3], float high[3])
+{
+    const __m128 inf = _mm_set1_ps(std::numeric_limits<float>::infinity());
+    const __m128 negInf = _mm_set1_ps(-std::numeric_limits<float>::infinity());
+    __m128 lo[3] = {inf, inf, inf}, hi[3] = {negInf, negInf, negInf};
+    __m128 odd = _mm_setzero_ps();
+    const LaneMasks* masks = Flagged ? &Masks() : nullptr;
+    const std::size_t whole = n / 4 * 4;
+    for (std::size_t k = 0; k < whole; k += 4) {
+        const float* q = p + 3 * k;
+        __m128 v[3] = {_mm_loadu_ps(q), _mm_loadu_ps(q + 4), _mm_loadu_ps(q + 8)};
+        if constexpr (Flagged) {
+            // The group's four flags pick one of sixteen lane masks; most
+            // groups are all set (or all holes) and need no mask.
+            const unsigned char* f = flags + k;
+            const unsigned pattern = (f[0] != 0) | (f[1] != 0) << 1 | (f[2] != 0) << 2 | (f[3] != 0) << 3;
+            if (pattern == 0) continue;
+            if (pattern != 15) {
+                const __m128* keep = masks->lanes[pattern];
+                for (int i = 0; i < 3; ++i) {
+                    const __m128 kept = _mm_and_ps(keep[i], v[i]);
+                    lo[i] = _mm_min_ps(lo[i], _mm_or_ps(kept, _mm_andnot_ps(keep[i], inf)));
+                    hi[i] = _mm_max_ps(hi[i], _mm_or_ps(kept, _mm_andnot_ps(keep[i], negInf)));
+                    odd = _mm_add_ps(odd, _mm_and_ps(keep[i], _mm_sub_ps(v[i], v[i])));
+                }
+                continue;
+            }
+        }
+        for (int i = 0; i < 3; ++i) {
+            lo[i] = _mm_min_ps(lo[i], v[i]);
+            hi[i] = _mm_max_ps(hi[i], v[i]);
+            odd = _mm_add_ps(odd, _mm_sub_ps(v[i], v[i]));
+        }
+    }
+    float lanes[3][4], highLanes[3][4], odds[4];
+    _mm_storeu_ps(odds, odd);
+    for (float o : odds)
+        if (o != 0) return false;
+    for (int i = 0; i < 3; ++i) {
+        _mm_storeu_ps(lanes[i], lo[i]);
+        _mm_storeu_ps(highLanes[i], hi[i]);
+    }
+    // Lane j of vector i holds axis (4 i + j) % 3.
+    for (int i = 0; i < 3; ++i)
+        for (int j = 0; j < 4; ++j) {
+            const int axis = (4 * i + j) % 3;
+            low[axis] = lanes[i][j] < low[axis] ? lanes[i][j] : low[axis];
+            high[axis] = highLanes[i][j] > high[axis] ? highLanes[i][j] : high[axis];
+        }
+    // The last points, one by one.
+    for (std::size_t k = whole; k < n; ++k) {
+        if (Flagged && !flags[k]) continue;
+        for (int a = 0; a < 3; ++a) {
+            const float value = p[3 * k + a];
+            if (value - value != 0) return false;
+            low[a] = value < low[a] ? value : low[a];
+            high[a] = value > high[a] ? value : high[a];
+        }
+    }
+    return true;
+}
+#endif
 
 template <class T>
 void AddTriplesToBox(const std::vector<T>& xyz, const unsigned char* flags, ZonMathBox& box)

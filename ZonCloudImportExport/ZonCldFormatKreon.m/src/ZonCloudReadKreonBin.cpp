@@ -13,7 +13,6 @@ namespace {
 using Tool = ZonCloudReadNLSTool;
 
 constexpr std::uint64_t HeaderSize = 128;
-constexpr std::uint64_t ValueSize = 4;
 constexpr std::uint64_t CentreSize = 8;
 
 template <class T>
@@ -36,7 +35,10 @@ void ZonCloudReadKreonBin::SetSamplingPercent(float percent)
 {
     const float before = _samplingPercent;
     ZonCloudReadFile::SetSamplingPercent(percent);
-    if (_samplingPercent != before) _cloudRead = false;
+    if (_samplingPercent != before) {
+        _cloudRead = false;
+        _gridRows.Clear();
+    }
 }
 
 ZonCloudReadKreonBin::GridKind ZonCloudReadKreonBin::GetGridKind()
@@ -67,6 +69,7 @@ void ZonCloudReadKreonBin::AnalyseFile()
     _cloud.clear();
     _cloudRead = false;
     _cursor.Reset();
+    _gridRows.Clear();
 
     ZonCloudByteSource& source = Source();
     unsigned char header[HeaderSize];
@@ -136,13 +139,18 @@ void ZonCloudReadKreonBin::GetBoundingBox(ZonMathBox& box)
             high[a] = -std::numeric_limits<float>::infinity();
         }
         Guarded([&] {
-            for (std::uint64_t row = 0; row < _rows; ++row)
-                ForEachMeasured(row, [&](std::uint64_t, const float* p) {
+            ZonCloudByteSource& source = Source();
+            Resize(_buffer, _columns * ValueSize);
+            source.Seek(_values);
+            for (std::uint64_t row = 0; row < _rows; ++row) {
+                source.Read(_buffer.data(), _buffer.size());
+                ForEachMeasured(row, _buffer.data(), [&](std::uint64_t, const float* p) {
                     for (int a = 0; a < 3; ++a) {
                         low[a] = p[a] < low[a] ? p[a] : low[a];
                         high[a] = p[a] > high[a] ? p[a] : high[a];
                     }
                 });
+            }
         });
         _boundingBox = ZonMathBox();
         if (low[0] <= high[0] && low[1] <= high[1] && low[2] <= high[2])
@@ -153,13 +161,8 @@ void ZonCloudReadKreonBin::GetBoundingBox(ZonMathBox& box)
 }
 
 template <class Visit>
-void ZonCloudReadKreonBin::ForEachMeasured(std::uint64_t row, Visit visit)
+void ZonCloudReadKreonBin::ForEachMeasured(std::uint64_t row, const unsigned char* bytes, Visit visit) const
 {
-    ZonCloudByteSource& source = Source();
-    Resize(_buffer, _columns * ValueSize);
-    source.Seek(_values + row * _columns * ValueSize);
-    source.Read(_buffer.data(), _buffer.size());
-
     // What the row adds: its height along the axis (planar y, cylinder z) and its centre.
     const double down = static_cast<double>(row) * _rowStep;
     double local[3] = {0.0, 0.0, _y0 - down};
@@ -174,7 +177,6 @@ void ZonCloudReadKreonBin::ForEachMeasured(std::uint64_t row, Visit visit)
     for (int a = 0; a < 3; ++a)
         rowBase[a] = _rotation[a][0] * local[0] + _rotation[a][1] * local[1] + _rotation[a][2] * local[2] + _translation[a];
 
-    const unsigned char* bytes = _buffer.data();
     const double* base = _columnBase.data();
     const double* scale = _columnScale.data();
     for (std::uint64_t column = 0; column < _columns; ++column, bytes += ValueSize, base += 3, scale += 3) {
@@ -190,14 +192,17 @@ void ZonCloudReadKreonBin::ForEachMeasured(std::uint64_t row, Visit visit)
 
 // ---- Reading ----------------------------------------------------------------
 
-void ZonCloudReadKreonBin::FillRow(std::uint64_t row, ZonCloudGridRow& target)
+std::uint64_t ZonCloudReadKreonBin::FillRow(std::uint64_t row, const unsigned char* bytes, ZonCloudGridRow& target) const
 {
     Allocating([&] { target.Start(_columns, _samplingPercent); });
-    ForEachMeasured(row, [&](std::uint64_t column, const float* p) {
+    ForEachMeasured(row, bytes, [&](std::uint64_t column, const float* p) {
         const std::int64_t slot = target.SlotOf(column);
         if (slot >= 0) target.Set(static_cast<std::size_t>(slot), p[0], p[1], p[2]);
     });
+    return 0;
 }
+
+void ZonCloudReadKreonBin::ListOwnedArrays(ZonCloudOwnedArrays& arrays) { _gridRows.ListOwnedArrays(arrays); }
 
 const float* ZonCloudReadKreonBin::GetPoints(unsigned& count)
 {
@@ -205,14 +210,16 @@ const float* ZonCloudReadKreonBin::GetPoints(unsigned& count)
     Analyse();
     if (!_cloudRead) {
         _cloud.clear();
-        // A row of its own, so that the grid row last delivered stays as it was.
-        ZonCloudGridRow cloudRow;
+        // Rows of their own, so that the grid row last delivered stays as it was.
+        ZonCloudGridRows cloudRows;
+        const auto fill = [this](std::uint64_t row, const unsigned char* bytes, ZonCloudGridRow& target) {
+            return FillRow(row, bytes, target);
+        };
         Guarded([&] {
             Reserve(_cloud, 3 * _rows * ZonCloudGridRow::SlotsFor(_columns, _samplingPercent));
-            for (std::uint64_t row = 0; row < _rows; ++row) {
-                FillRow(row, cloudRow);
-                cloudRow.AppendValid(_cloud);
-            }
+            std::uint64_t measured = 0;
+            for (std::uint64_t row = 0; row < _rows; ++row)
+                cloudRows.Get(Source(), ValueTable(), row, fill, measured).AppendValid(_cloud);
         });
         _cloudRead = true;
     }
@@ -242,6 +249,7 @@ void ZonCloudReadKreonBin::BeginGetGridPoints()
 {
     RequireGrid();
     _cursor.BeginRows();
+    _gridRows.Clear();
 }
 
 const float* ZonCloudReadKreonBin::GetGridPoints(unsigned& count, const unsigned char*& valid)
@@ -250,6 +258,14 @@ const float* ZonCloudReadKreonBin::GetGridPoints(unsigned& count, const unsigned
     valid = nullptr;
     RequireGrid();
     if (!_cursor.NextRow(static_cast<std::size_t>(_rows))) return nullptr;
-    Guarded([&] { FillRow(_cursor.Row(), _row); });
-    return _row.Deliver(count, valid);
+    const float* points = nullptr;
+    Guarded([&] {
+        std::uint64_t measured = 0;
+        const ZonCloudGridRow& row = _gridRows.Get(
+            Source(), ValueTable(), _cursor.Row(),
+            [this](std::uint64_t j, const unsigned char* bytes, ZonCloudGridRow& target) { return FillRow(j, bytes, target); },
+            measured);
+        points = row.Deliver(count, valid);
+    });
+    return points;
 }

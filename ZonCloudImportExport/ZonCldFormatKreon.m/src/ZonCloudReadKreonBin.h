@@ -4,6 +4,7 @@
 
 #include "ZonCloudGridCursor.h"
 #include "ZonCloudGridRow.h"
+#include "ZonCloudGridRows.h"
 #include "ZonCloudReadFile.h"
 #include "ZonTieCloudReadFile.h"
 
@@ -16,7 +17,7 @@
 // Rows run downward: row j lies j steps below the first. Around a cylinder,
 // column i lies at the angle i * 2 pi / N. The analysis checks the header,
 // reads the row centres and walks the value table once for the box; rows are
-// then read back straight from the table.
+// then read back straight from the table, a batch at a time on all cores.
 class ZonCloudReadKreonBin : public ZonCloudReadFile, public ZonTieCloudReadGridFile<ZonCloudReadKreonBin> {
 public:
     enum GridKind { Planar = 1, Cylindrical = 2, CylindricalWithCentres = 6 };
@@ -46,14 +47,19 @@ public:
 
 protected:
     void AnalyseFile() override;
+    void ListOwnedArrays(ZonCloudOwnedArrays& arrays) override;
 
 private:
-    // Calls visit(column, point) for each measured node of row j (from 0),
-    // its point in the model.
+    // Calls visit(column, point) for each measured node of row j (from 0)
+    // whose values are `bytes`, its point in the model. Changes nothing, so
+    // rows may be read side by side.
     template <class Visit>
-    void ForEachMeasured(std::uint64_t row, Visit visit);
-    void FillRow(std::uint64_t row, ZonCloudGridRow& target);
+    void ForEachMeasured(std::uint64_t row, const unsigned char* bytes, Visit visit) const;
+    std::uint64_t FillRow(std::uint64_t row, const unsigned char* bytes, ZonCloudGridRow& target) const;
+    ZonCloudGridRows::Table ValueTable() const { return {_values, _columns * ValueSize, _rows}; }
     void RequireGrid();
+
+    static constexpr std::uint64_t ValueSize = 4;
 
     GridKind _kind = Planar;
     std::uint64_t _columns = 0, _rows = 0;
@@ -70,7 +76,7 @@ private:
     std::vector<unsigned char> _buffer;
 
     ZonCloudGridCursor _cursor;
-    ZonCloudGridRow _row;
+    ZonCloudGridRows _gridRows;
     std::vector<float> _cloud;
     bool _cloudRead = false;
 };

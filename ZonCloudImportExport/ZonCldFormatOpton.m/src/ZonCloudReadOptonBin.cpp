@@ -14,7 +14,6 @@ using Tool = ZonCloudReadNLSTool;
 
 constexpr std::uint64_t RecordSize = 16;
 constexpr std::uint64_t HeaderRecords = 7;
-constexpr std::uint64_t Chunk = std::uint64_t{1} << 20;
 // The fourth value of a node that was not measured.
 constexpr float NotMeasured = -1.0f;
 
@@ -41,7 +40,10 @@ void ZonCloudReadOptonBin::SetSamplingPercent(float percent)
 {
     const float before = _samplingPercent;
     ZonCloudReadFile::SetSamplingPercent(percent);
-    if (_samplingPercent != before) _cloudRead = false;
+    if (_samplingPercent != before) {
+        _cloudRead = false;
+        _gridRows.Clear();
+    }
 }
 
 unsigned ZonCloudReadOptonBin::GetNumberOfRows()
@@ -71,6 +73,7 @@ void ZonCloudReadOptonBin::AnalyseFile()
     _cloud.clear();
     _cloudRead = false;
     _cursor.Reset();
+    _gridRows.Clear();
 
     ZonCloudByteSource& source = Source();
     unsigned char header[HeaderRecords * RecordSize];
@@ -108,27 +111,22 @@ void ZonCloudReadOptonBin::AnalyseFile()
 
 // ---- Reading ----------------------------------------------------------------
 
-std::uint64_t ZonCloudReadOptonBin::FillRow(std::uint64_t row, ZonCloudGridRow& target)
+std::uint64_t ZonCloudReadOptonBin::FillRow(std::uint64_t, const unsigned char* bytes, ZonCloudGridRow& target) const
 {
     Allocating([&] { target.Start(_columns, _samplingPercent); });
-    ZonCloudByteSource& source = Source();
-    source.Seek(_data + row * _columns * RecordSize);
-    const std::uint64_t perChunk = Chunk / RecordSize;
-    Resize(_buffer, std::min(_columns, perChunk) * RecordSize);
     std::uint64_t measured = 0;
-    for (std::uint64_t column = 0; column < _columns;) {
-        const std::uint64_t n = std::min(_columns - column, perChunk);
-        source.Read(_buffer.data(), static_cast<std::size_t>(n * RecordSize));
-        const unsigned char* bytes = _buffer.data();
-        for (std::uint64_t i = 0; i < n; ++i, ++column, bytes += RecordSize) {
-            if (Word(bytes, 3) == NotMeasured) continue;
-            ++measured;
-            const std::int64_t slot = target.SlotOf(column);
-            if (slot >= 0) target.Set(static_cast<std::size_t>(slot), Word(bytes, 0), Word(bytes, 1), Word(bytes, 2));
-        }
+    for (std::uint64_t column = 0; column < _columns; ++column, bytes += RecordSize) {
+        if (Word(bytes, 3) == NotMeasured) continue;
+        ++measured;
+        const std::int64_t slot = target.SlotOf(column);
+        if (slot >= 0) target.Set(static_cast<std::size_t>(slot), Word(bytes, 0), Word(bytes, 1), Word(bytes, 2));
     }
     return measured;
 }
+
+ZonCloudGridRows::Table ZonCloudReadOptonBin::RecordTable() const { return {_data, _columns * RecordSize, _rows}; }
+
+void ZonCloudReadOptonBin::ListOwnedArrays(ZonCloudOwnedArrays& arrays) { _gridRows.ListOwnedArrays(arrays); }
 
 const float* ZonCloudReadOptonBin::GetPoints(unsigned& count)
 {
@@ -136,14 +134,18 @@ const float* ZonCloudReadOptonBin::GetPoints(unsigned& count)
     Analyse();
     if (!_cloudRead) {
         _cloud.clear();
-        ZonCloudGridRow cloudRow;  // the grid row last delivered stays as it was
+        ZonCloudGridRows cloudRows;  // the grid row last delivered stays as it was
+        const auto fill = [this](std::uint64_t row, const unsigned char* bytes, ZonCloudGridRow& target) {
+            return FillRow(row, bytes, target);
+        };
         std::uint64_t measured = 0;
         Guarded([&] {
             const std::uint64_t nodes = _rows * _columns;
             Reserve(_cloud, 3 * std::min(nodes, _rows * ZonCloudGridRow::SlotsFor(_columns, _samplingPercent)));
             for (std::uint64_t row = 0; row < _rows; ++row) {
-                measured += FillRow(row, cloudRow);
-                cloudRow.AppendValid(_cloud);
+                std::uint64_t inRow = 0;
+                cloudRows.Get(Source(), RecordTable(), row, fill, inRow).AppendValid(_cloud);
+                measured += inRow;
             }
         });
         _cloudRead = true;
@@ -176,6 +178,7 @@ void ZonCloudReadOptonBin::BeginGetGridPoints()
 {
     RequireGrid();
     _cursor.BeginRows();
+    _gridRows.Clear();
     _measuredInWalk = 0;
 }
 
@@ -185,8 +188,17 @@ const float* ZonCloudReadOptonBin::GetGridPoints(unsigned& count, const unsigned
     valid = nullptr;
     RequireGrid();
     if (!_cursor.NextRow(static_cast<std::size_t>(_rows))) return nullptr;
-    Guarded([&] { _measuredInWalk += FillRow(_cursor.Row(), _row); });
+    const float* points = nullptr;
+    Guarded([&] {
+        std::uint64_t measured = 0;
+        const ZonCloudGridRow& row = _gridRows.Get(
+            Source(), RecordTable(), _cursor.Row(),
+            [this](std::uint64_t j, const unsigned char* bytes, ZonCloudGridRow& target) { return FillRow(j, bytes, target); },
+            measured);
+        _measuredInWalk += measured;
+        points = row.Deliver(count, valid);
+    });
     // The last row of a walk from the first: the file has been read whole.
     if (_cursor.Row() + 1 == _rows) _numberOfPoints = static_cast<int>(_measuredInWalk);
-    return _row.Deliver(count, valid);
+    return points;
 }

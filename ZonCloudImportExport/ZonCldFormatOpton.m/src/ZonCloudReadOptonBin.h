@@ -4,6 +4,7 @@
 
 #include "ZonCloudGridCursor.h"
 #include "ZonCloudGridRow.h"
+#include "ZonCloudGridRows.h"
 #include "ZonCloudReadFile.h"
 #include "ZonTieCloudReadFile.h"
 
@@ -40,19 +41,21 @@ public:
 
 protected:
     void AnalyseFile() override;
+    void ListOwnedArrays(ZonCloudOwnedArrays& arrays) override;
 
 private:
-    // Fills `target` with row `row` (from 0); returns the measured records of
-    // the whole row, sampled or not.
-    std::uint64_t FillRow(std::uint64_t row, ZonCloudGridRow& target);
+    // Fills `target` with row `row` (from 0) from its records `bytes`; returns
+    // the measured records of the whole row, sampled or not. Changes nothing
+    // else, so rows may be filled side by side.
+    std::uint64_t FillRow(std::uint64_t row, const unsigned char* bytes, ZonCloudGridRow& target) const;
+    ZonCloudGridRows::Table RecordTable() const;
     void RequireGrid();
 
     std::uint64_t _rows = 0, _columns = 0;
     std::uint64_t _data = 0;
-    std::vector<unsigned char> _buffer;
 
     ZonCloudGridCursor _cursor;
-    ZonCloudGridRow _row;
+    ZonCloudGridRows _gridRows;
     std::uint64_t _measuredInWalk = 0;  // measured records of the rows given in this grid walk
     std::vector<float> _cloud;
     bool _cloudRead = false;

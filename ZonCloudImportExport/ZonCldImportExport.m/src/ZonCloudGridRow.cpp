@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <limits>
 
+#include "ZonCloudOwnedArrays.h"
 #include "ZonCloudReadNLSTool.h"
 
 std::uint64_t ZonCloudGridRow::SlotsFor(std::uint64_t columns, float percent)
@@ -20,6 +21,12 @@ void ZonCloudGridRow::Start(std::uint64_t columns, float percent)
     _slots = static_cast<std::size_t>(SlotsFor(columns, percent));
     _points.assign(3 * _slots, 0.0f);
     _valid.assign(_slots, 0);
+}
+
+void ZonCloudGridRow::ListArrays(ZonCloudOwnedArrays& arrays)
+{
+    arrays.Add(_points);
+    arrays.Add(_valid);
 }
 
 void ZonCloudGridRow::AppendValid(std::vector<float>& cloud) const

@@ -5,6 +5,8 @@
 
 #include "ZonCldExport.h"
 
+class ZonCloudOwnedArrays;
+
 // One delivered row of a grid: points of three floats in slots, with a
 // validity byte per slot (1 a measured node, 0 a hole). The sampling rule of
 // every grid format lives here: with r = percent / 100 (a float), a row of C
@@ -46,6 +48,10 @@ public:
         valid = _valid.data();
         return _points.data();
     }
+    // False once an importer has taken the row's arrays over.
+    bool IsWhole() const { return _points.size() == 3 * _slots && _valid.size() == _slots; }
+    // The row's arrays, for a reader's hand-over.
+    void ListArrays(ZonCloudOwnedArrays& arrays);
     // Appends the row's valid points to a cloud.
     void AppendValid(std::vector<float>& cloud) const;
 
