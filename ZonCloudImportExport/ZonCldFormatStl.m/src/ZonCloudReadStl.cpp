@@ -6,6 +6,7 @@
 #include <cstring>
 #include <limits>
 #include <new>
+#include <optional>
 
 #include "DecimalPointGuard.h"
 #include "ZonCloudChunkedText.h"
@@ -656,7 +657,8 @@ void ZonCloudReadStl::AnalyseBinaryInChunks(const unsigned char* mapped, std::ui
     _vertices = {};
     _triangles = {};
     Reserve(_vertices, 3 * expected);
-    ZonCloudVertexTable<float> table(_vertices, expected);
+    // Made by the first stitch, while the workers parse the first chunks.
+    std::optional<ZonCloudVertexTable<float>> table;
     BoxAccumulator<float> box;
     const bool native = _nativeOrder;
 
@@ -692,13 +694,14 @@ void ZonCloudReadStl::AnalyseBinaryInChunks(const unsigned char* mapped, std::ui
     };
     std::vector<Numbered> numbered;
     const auto stitch = [&](CornerChunk<float>& chunk) {
+        if (!table) table.emplace(_vertices, expected);
         box.Merge(chunk.box);
         const std::size_t distinct = chunk.distinctHashes.size();
         Numbered& n = numbered.emplace_back();
         n.global.resize(distinct);
         for (std::size_t i = 0; i < distinct; ++i) {
-            if (i + kAhead < distinct) table.Prefetch(chunk.distinctHashes[i + kAhead]);
-            n.global[i] = table.Index(chunk.distinct.data() + 3 * i, chunk.distinctHashes[i]);
+            if (i + kAhead < distinct) table->Prefetch(chunk.distinctHashes[i + kAhead]);
+            n.global[i] = table->Index(chunk.distinct.data() + 3 * i, chunk.distinctHashes[i]);
         }
         n.local = std::move(chunk.local);
         chunk.local = {};

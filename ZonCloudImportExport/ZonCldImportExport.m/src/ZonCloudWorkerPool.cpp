@@ -64,7 +64,8 @@ void ZonCloudWorkerPool::SetThreadCount(unsigned count)
 void ZonCloudWorkerPool::Populate(void* data, std::size_t bytes)
 {
 #ifdef MADV_POPULATE_WRITE
-    constexpr std::size_t Worth = std::size_t(16) << 20;
+    // Below a few MB the faults cost less than starting a worker.
+    constexpr std::size_t Worth = std::size_t(4) << 20;
     const unsigned threads = ThreadCount();
     if (!data || bytes < Worth || threads < 2) return;
     const auto page = static_cast<std::uintptr_t>(sysconf(_SC_PAGESIZE));
