@@ -29,7 +29,13 @@ T Little(const unsigned char* p)
 
 }  // namespace
 
-ZonCloudReadKreonBin::ZonCloudReadKreonBin(const ZonUnicodeString& fileName) : ZonCloudReadFile(fileName) {}
+ZonCloudReadKreonBin::ZonCloudReadKreonBin(const ZonUnicodeString& fileName)
+    : ZonCloudReadFile(fileName),
+      _fill([this](std::uint64_t row, const unsigned char* bytes, ZonCloudGridRow& target) {
+          return FillRow(row, bytes, target);
+      })
+{
+}
 
 void ZonCloudReadKreonBin::SetSamplingPercent(float percent)
 {
@@ -210,16 +216,9 @@ const float* ZonCloudReadKreonBin::GetPoints(unsigned& count)
     Analyse();
     if (!_cloudRead) {
         _cloud.clear();
-        // Rows of their own, so that the grid row last delivered stays as it was.
-        ZonCloudGridRows cloudRows;
-        const auto fill = [this](std::uint64_t row, const unsigned char* bytes, ZonCloudGridRow& target) {
-            return FillRow(row, bytes, target);
-        };
         Guarded([&] {
             Reserve(_cloud, 3 * _rows * ZonCloudGridRow::SlotsFor(_columns, _samplingPercent));
-            std::uint64_t measured = 0;
-            for (std::uint64_t row = 0; row < _rows; ++row)
-                cloudRows.Get(Source(), ValueTable(), row, fill, measured).AppendValid(_cloud);
+            ZonCloudGridRows::AppendAll(Source(), ValueTable(), _fill, _cloud);
         });
         _cloudRead = true;
     }
@@ -261,10 +260,7 @@ const float* ZonCloudReadKreonBin::GetGridPoints(unsigned& count, const unsigned
     const float* points = nullptr;
     Guarded([&] {
         std::uint64_t measured = 0;
-        const ZonCloudGridRow& row = _gridRows.Get(
-            Source(), ValueTable(), _cursor.Row(),
-            [this](std::uint64_t j, const unsigned char* bytes, ZonCloudGridRow& target) { return FillRow(j, bytes, target); },
-            measured);
+        const ZonCloudGridRow& row = _gridRows.Get(Source(), ValueTable(), _cursor.Row(), _fill, measured);
         points = row.Deliver(count, valid);
     });
     return points;

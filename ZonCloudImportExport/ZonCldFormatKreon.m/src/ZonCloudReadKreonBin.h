@@ -77,6 +77,7 @@ private:
 
     ZonCloudGridCursor _cursor;
     ZonCloudGridRows _gridRows;
+    const ZonCloudGridRows::Fill _fill;  // FillRow
     std::vector<float> _cloud;
     bool _cloudRead = false;
 };

@@ -34,7 +34,13 @@ std::uint64_t Count(float value)
 
 }  // namespace
 
-ZonCloudReadOptonBin::ZonCloudReadOptonBin(const ZonUnicodeString& fileName) : ZonCloudReadFile(fileName) {}
+ZonCloudReadOptonBin::ZonCloudReadOptonBin(const ZonUnicodeString& fileName)
+    : ZonCloudReadFile(fileName),
+      _fill([this](std::uint64_t row, const unsigned char* bytes, ZonCloudGridRow& target) {
+          return FillRow(row, bytes, target);
+      })
+{
+}
 
 void ZonCloudReadOptonBin::SetSamplingPercent(float percent)
 {
@@ -134,19 +140,11 @@ const float* ZonCloudReadOptonBin::GetPoints(unsigned& count)
     Analyse();
     if (!_cloudRead) {
         _cloud.clear();
-        ZonCloudGridRows cloudRows;  // the grid row last delivered stays as it was
-        const auto fill = [this](std::uint64_t row, const unsigned char* bytes, ZonCloudGridRow& target) {
-            return FillRow(row, bytes, target);
-        };
         std::uint64_t measured = 0;
         Guarded([&] {
             const std::uint64_t nodes = _rows * _columns;
             Reserve(_cloud, 3 * std::min(nodes, _rows * ZonCloudGridRow::SlotsFor(_columns, _samplingPercent)));
-            for (std::uint64_t row = 0; row < _rows; ++row) {
-                std::uint64_t inRow = 0;
-                cloudRows.Get(Source(), RecordTable(), row, fill, inRow).AppendValid(_cloud);
-                measured += inRow;
-            }
+            measured = ZonCloudGridRows::AppendAll(Source(), RecordTable(), _fill, _cloud);
         });
         _cloudRead = true;
         _numberOfPoints = static_cast<int>(measured);
@@ -191,10 +189,7 @@ const float* ZonCloudReadOptonBin::GetGridPoints(unsigned& count, const unsigned
     const float* points = nullptr;
     Guarded([&] {
         std::uint64_t measured = 0;
-        const ZonCloudGridRow& row = _gridRows.Get(
-            Source(), RecordTable(), _cursor.Row(),
-            [this](std::uint64_t j, const unsigned char* bytes, ZonCloudGridRow& target) { return FillRow(j, bytes, target); },
-            measured);
+        const ZonCloudGridRow& row = _gridRows.Get(Source(), RecordTable(), _cursor.Row(), _fill, measured);
         _measuredInWalk += measured;
         points = row.Deliver(count, valid);
     });

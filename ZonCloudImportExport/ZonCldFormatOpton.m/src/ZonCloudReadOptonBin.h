@@ -56,6 +56,7 @@ private:
 
     ZonCloudGridCursor _cursor;
     ZonCloudGridRows _gridRows;
+    const ZonCloudGridRows::Fill _fill;  // FillRow
     std::uint64_t _measuredInWalk = 0;  // measured records of the rows given in this grid walk
     std::vector<float> _cloud;
     bool _cloudRead = false;

@@ -35,6 +35,19 @@ const ZonCloudGridRow& ZonCloudGridRows::Get(ZonCloudByteSource& source, const T
     return _batch[_delivered];
 }
 
+std::uint64_t ZonCloudGridRows::AppendAll(ZonCloudByteSource& source, const Table& table, const Fill& fill,
+                                          std::vector<float>& cloud)
+{
+    ZonCloudGridRows rows;
+    std::uint64_t measured = 0;
+    for (std::uint64_t row = 0; row < table.rows; ++row) {
+        std::uint64_t inRow = 0;
+        rows.Get(source, table, row, fill, inRow).AppendValid(cloud);
+        measured += inRow;
+    }
+    return measured;
+}
+
 void ZonCloudGridRows::Build(ZonCloudByteSource& source, const Table& table, std::uint64_t first, const Fill& fill)
 {
     const std::uint64_t perBatch = std::max<std::uint64_t>(1, BatchBytes / std::max<std::uint64_t>(1, table.rowBytes));

@@ -35,6 +35,11 @@ public:
     // table must lie within the source (the reader checks it with Fits).
     const ZonCloudGridRow& Get(ZonCloudByteSource& source, const Table& table, std::uint64_t row, const Fill& fill,
                                std::uint64_t& measured);
+    // Appends the valid points of every row of the table to `cloud`, built in
+    // batches of their own (a walk's rows stay as they were); answers the
+    // measured nodes of all rows.
+    static std::uint64_t AppendAll(ZonCloudByteSource& source, const Table& table, const Fill& fill,
+                                   std::vector<float>& cloud);
     // The arrays of the row Get gave last, for the reader's hand-over (an
     // importer takes a row when it gets it).
     void ListOwnedArrays(ZonCloudOwnedArrays& arrays);
