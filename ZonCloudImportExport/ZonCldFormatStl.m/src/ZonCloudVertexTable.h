@@ -7,6 +7,8 @@
 #include <type_traits>
 #include <vector>
 
+#include "ZonCloudWorkerPool.h"
+
 // Merges the corners of a triangle soup into distinct vertices. Two corners
 // are one vertex when their coordinates compare equal as floating-point
 // values: -0.0 and 0.0 are one vertex, a NaN equals nothing (so a corner with
@@ -25,7 +27,7 @@ public:
     {
         std::size_t size = 16;
         while (IsCrowded(expectedDistinct, size)) size *= 2;
-        _slots.resize(size);
+        Allocate(_slots, size);
         _mask = size - 1;
     }
 
@@ -82,9 +84,18 @@ private:
         return static_cast<std::uint32_t>(index);
     }
 
+    // Free slots; a large table is asked in huge pages, as its slots are hit at random.
+    static void Allocate(std::vector<Slot>& slots, std::size_t size)
+    {
+        slots.reserve(size);
+        ZonCloudWorkerPool::AdviseHugePages(slots.data(), size * sizeof(Slot));
+        slots.resize(size);
+    }
+
     void Grow()
     {
-        std::vector<Slot> bigger(2 * _slots.size());
+        std::vector<Slot> bigger;
+        Allocate(bigger, 2 * _slots.size());
         const std::size_t mask = bigger.size() - 1;
         for (const Slot& slot : _slots) {
             if (slot.index1 == 0) continue;

@@ -123,7 +123,10 @@ protected:
     {
         Allocating([&] {
             if (n > v.max_size()) RaiseMemoryError();
-            v.reserve(static_cast<std::size_t>(n));
+            if (n > v.capacity()) {
+                v.reserve(static_cast<std::size_t>(n));
+                ZonCloudWorkerPool::AdviseHugePages(v.data() + v.size(), (v.capacity() - v.size()) * sizeof(T));
+            }
         });
     }
     // The same for n elements in use. The pages of a large growth are made

@@ -61,17 +61,37 @@ void ZonCloudWorkerPool::SetThreadCount(unsigned count)
     fixedCount.store(std::min(count, 64u), std::memory_order_relaxed);
 }
 
+namespace {
+// Below a few MB the faults cost less than the advice and the workers.
+constexpr std::size_t Worth = std::size_t(4) << 20;
+
+// The whole pages inside [data, data + bytes).
+bool InnerPages(void* data, std::size_t bytes, std::uintptr_t& begin, std::uintptr_t& end)
+{
+    if (!data || bytes < Worth) return false;
+    const auto page = static_cast<std::uintptr_t>(sysconf(_SC_PAGESIZE));
+    begin = (reinterpret_cast<std::uintptr_t>(data) + page - 1) / page * page;
+    end = (reinterpret_cast<std::uintptr_t>(data) + bytes) / page * page;
+    return begin < end;
+}
+}  // namespace
+
+void ZonCloudWorkerPool::AdviseHugePages(void* data, std::size_t bytes)
+{
+    std::uintptr_t begin = 0, end = 0;
+    if (!InnerPages(data, bytes, begin, end)) return;
+#ifdef MADV_HUGEPAGE
+    madvise(reinterpret_cast<void*>(begin), end - begin, MADV_HUGEPAGE);
+#endif
+}
+
 void ZonCloudWorkerPool::Populate(void* data, std::size_t bytes)
 {
+    AdviseHugePages(data, bytes);
+    std::uintptr_t begin = 0, end = 0;
+    if (!InnerPages(data, bytes, begin, end)) return;
 #ifdef MADV_POPULATE_WRITE
-    // Below a few MB the faults cost less than starting a worker.
-    constexpr std::size_t Worth = std::size_t(4) << 20;
-    const unsigned threads = ThreadCount();
-    if (!data || bytes < Worth || threads < 2) return;
-    const auto page = static_cast<std::uintptr_t>(sysconf(_SC_PAGESIZE));
-    const std::uintptr_t begin = (reinterpret_cast<std::uintptr_t>(data) + page - 1) / page * page;
-    const std::uintptr_t end = (reinterpret_cast<std::uintptr_t>(data) + bytes) / page * page;
-    if (end <= begin) return;
+    if (ThreadCount() < 2) return;
     // Slices of a few MB, taken in turn, keep both cores busy to the end.
     const std::uintptr_t slice = std::uintptr_t(4) << 20;
     const std::size_t count = (end - begin + slice - 1) / slice;
@@ -80,9 +100,6 @@ void ZonCloudWorkerPool::Populate(void* data, std::size_t bytes)
         // A kernel without this advice answers EINVAL: the pages then come on first touch.
         madvise(reinterpret_cast<void*>(from), to - from, MADV_POPULATE_WRITE);
     });
-#else
-    (void)data;
-    (void)bytes;
 #endif
 }
 

@@ -18,9 +18,14 @@ public:
 
     // Makes the pages of freshly allocated memory present, in slices on the
     // workers: the kernel then zeroes and maps them on both cores instead of
-    // one page fault at a time on first touch. Only worth it for large
-    // blocks; does nothing for small ones or where the system cannot.
+    // one page fault at a time on first touch, in huge pages where the system
+    // offers them on request. Only worth it for large blocks; does nothing
+    // for small ones or where the system cannot.
     static void Populate(void* data, std::size_t bytes);
+    // Asks for huge pages over a large block that is filled later: where the
+    // system offers them on request, a 2 MB page then costs one fault and one
+    // clearing instead of 512. Untouched parts still take no memory.
+    static void AdviseHugePages(void* data, std::size_t bytes);
 
     // Runs work(i) for every i in [0, count) on at most `threads` threads
     // (0: ThreadCount()), the calling thread included. After a failure no new
