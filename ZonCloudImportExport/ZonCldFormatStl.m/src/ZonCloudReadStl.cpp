@@ -552,10 +552,24 @@ struct CornerChunk {
     std::vector<std::uint32_t> failures;  // text: corners parsed before each vertex line that failed
     BoxAccumulator<float> box;            // binary: the box of the chunk's corners
     // Binary: the chunk's own distinct corners in order of first appearance,
-    // their hashes, and each corner's number among them.
+    // their hashes, the table that merged them (kept from chunk to chunk),
+    // and where the chunk's corner numbers stand in the triangle array.
     std::vector<T> distinct;
     std::vector<std::uint32_t> distinctHashes;
-    std::vector<std::uint32_t> local;
+    std::optional<ZonCloudVertexTable<T>> own;
+    std::size_t at = 0, values = 0;
+
+    // As a new chunk, with its arrays' memory kept.
+    void Reuse()
+    {
+        corners.clear();
+        hashes.clear();
+        failures.clear();
+        box = BoxAccumulator<float>();
+        distinct.clear();
+        distinctHashes.clear();
+        at = values = 0;
+    }
 };
 
 }  // namespace
@@ -664,13 +678,25 @@ void ZonCloudReadStl::AnalyseBinaryInChunks(const unsigned char* mapped, std::ui
 
     // Each chunk first merges its own corners on a worker, so the stitch looks
     // up only the chunk's distinct corners, in their order of first appearance:
-    // the numbering is the one a single pass over every corner gives.
-    const auto parse = [native](const unsigned char* record, std::size_t count, CornerChunk<float>& chunk) {
+    // the numbering is the one a single pass over every corner gives. The
+    // workers write each corner's number within its chunk straight into the
+    // triangle array; it becomes the global one once every chunk is stitched.
+    Resize(_triangles, 3 * records);
+    std::uint32_t* const triangles = _triangles.data();
+    const unsigned char* const firstRecord = mapped + 84;
+    const auto parse = [native, triangles, firstRecord](const unsigned char* record, std::size_t count,
+                                                        CornerChunk<float>& chunk) {
+        chunk.at = 3 * static_cast<std::size_t>((record - firstRecord) / kRecordSize);
+        chunk.values = 3 * count;
         chunk.corners.resize(9 * count);
-        chunk.local.resize(3 * count);
         chunk.distinct.clear();
         chunk.distinctHashes.clear();
-        ZonCloudVertexTable<float> own(chunk.distinct, 3 * count / 4 + 16);
+        const std::size_t expectedHere = ExpectedDistinct(static_cast<std::uint32_t>(count));
+        if (chunk.own)
+            chunk.own->Reset(expectedHere);
+        else
+            chunk.own.emplace(chunk.distinct, expectedHere);
+        std::uint32_t* numbers = triangles + chunk.at;
         for (std::size_t r = 0; r < count; ++r, record += kRecordSize) {
             float* corners = chunk.corners.data() + 9 * r;
             if (native)
@@ -681,16 +707,17 @@ void ZonCloudReadStl::AnalyseBinaryInChunks(const unsigned char* mapped, std::ui
                 const float* corner = corners + 3 * k;
                 chunk.box.Add(corner);
                 const std::uint32_t hash = ZonCloudVertexTable<float>::HashOf(corner);
-                const std::uint32_t number = own.Index(corner, hash);
+                const std::uint32_t number = chunk.own->Index(corner, hash);
                 if (number == chunk.distinctHashes.size()) chunk.distinctHashes.push_back(hash);
-                chunk.local[3 * r + static_cast<std::size_t>(k)] = number;
+                *numbers++ = number;
             }
         }
     };
     // The stitch numbers each chunk's distinct corners; the corners themselves
-    // are numbered afterwards, chunk by chunk on the workers.
+    // are renumbered afterwards, chunk by chunk on the workers.
     struct Numbered {
-        std::vector<std::uint32_t> local, global;
+        std::size_t at = 0, values = 0;
+        std::vector<std::uint32_t> global;
     };
     std::vector<Numbered> numbered;
     const auto stitch = [&](CornerChunk<float>& chunk) {
@@ -698,22 +725,20 @@ void ZonCloudReadStl::AnalyseBinaryInChunks(const unsigned char* mapped, std::ui
         box.Merge(chunk.box);
         const std::size_t distinct = chunk.distinctHashes.size();
         Numbered& n = numbered.emplace_back();
+        n.at = chunk.at;
+        n.values = chunk.values;
         n.global.resize(distinct);
         for (std::size_t i = 0; i < distinct; ++i) {
             if (i + kAhead < distinct) table->Prefetch(chunk.distinctHashes[i + kAhead]);
             n.global[i] = table->Index(chunk.distinct.data() + 3 * i, chunk.distinctHashes[i]);
         }
-        n.local = std::move(chunk.local);
-        chunk.local = {};
         return true;
     };
     ZonCloudChunkedText::RunRecords<CornerChunk<float>>(_source, mapped, 84, records, kRecordSize, parse, stitch);
-    std::vector<std::size_t> starts(numbered.size() + 1, 0);
-    for (std::size_t c = 0; c < numbered.size(); ++c) starts[c + 1] = starts[c] + numbered[c].local.size();
-    Resize(_triangles, starts.back());
     ZonCloudWorkerPool::Run(numbered.size(), [&](std::size_t c) {
-        std::uint32_t* out = _triangles.data() + starts[c];
-        for (const std::uint32_t number : numbered[c].local) *out++ = numbered[c].global[number];
+        std::uint32_t* number = triangles + numbered[c].at;
+        const std::uint32_t* global = numbered[c].global.data();
+        for (std::size_t i = 0; i < numbered[c].values; ++i, ++number) *number = global[*number];
         numbered[c] = {};
     });
     numbered = {};

@@ -1,4 +1,5 @@
 #pragma once
+#include <algorithm>
 #include <bit>
 #include <cstddef>
 #include <cstdint>
@@ -29,6 +30,22 @@ public:
         while (IsCrowded(expectedDistinct, size)) size *= 2;
         Allocate(_slots, size);
         _mask = size - 1;
+    }
+
+    // Starts again with no vertex, for at least `expectedDistinct` of them,
+    // keeping the table's memory (the caller clears the vertices).
+    void Reset(std::size_t expectedDistinct)
+    {
+        std::size_t size = 16;
+        while (IsCrowded(expectedDistinct, size)) size *= 2;
+        if (size > _slots.size()) {
+            std::vector<Slot>().swap(_slots);
+            Allocate(_slots, size);
+        } else {
+            std::fill(_slots.begin(), _slots.end(), Slot{});
+        }
+        _mask = _slots.size() - 1;
+        _used = 0;
     }
 
     // The index of the vertex at xyz[0..2], appended when new.

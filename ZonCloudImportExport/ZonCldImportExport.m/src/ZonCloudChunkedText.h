@@ -5,6 +5,7 @@
 #include <cstdint>
 #include <cstring>
 #include <memory>
+#include <mutex>
 #include <vector>
 
 #include "ZonCldExport.h"
@@ -134,25 +135,46 @@ public:
 private:
     // Chunk i lives in slot i % window from its parse to its stitch: the pool
     // never works on more than `window` items past the one being consumed.
+    // A chunk type with a Reuse() (which makes it as a new one, keeping its
+    // memory) is handed from a stitched chunk to the next parse, so its arrays
+    // are not allocated and faulted in afresh for every chunk.
     template <class Chunk, class Work, class Stitch>
     static void InOrder(std::size_t count, Work&& work, Stitch&& stitch)
     {
+        constexpr bool reusable = requires(Chunk& c) { c.Reuse(); };
         const unsigned threads = ZonCloudWorkerPool::ThreadCount();
         const std::size_t window = 2 * static_cast<std::size_t>(threads) + 2;
         std::vector<std::unique_ptr<Chunk>> slots(std::min(window, std::max<std::size_t>(count, 1)));
+        std::mutex spareLock;
+        std::vector<std::unique_ptr<Chunk>> spare;
         std::atomic<bool> stopped{false};
         ZonCloudWorkerPool::Ordered(
             count,
             [&](std::size_t i) {
-                auto chunk = std::make_unique<Chunk>();
+                std::unique_ptr<Chunk> chunk;
+                if constexpr (reusable) {
+                    std::lock_guard lock(spareLock);
+                    if (!spare.empty()) {
+                        chunk = std::move(spare.back());
+                        spare.pop_back();
+                    }
+                }
+                if constexpr (reusable) {
+                    if (chunk) chunk->Reuse();
+                }
+                if (!chunk) chunk = std::make_unique<Chunk>();
                 // After a stop the rest is not worth parsing.
                 if (!stopped.load(std::memory_order_relaxed)) work(i, *chunk);
                 slots[i % slots.size()] = std::move(chunk);
             },
             [&](std::size_t i) {
-                const std::unique_ptr<Chunk> chunk = std::move(slots[i % slots.size()]);
+                std::unique_ptr<Chunk> chunk = std::move(slots[i % slots.size()]);
                 if (!stopped.load(std::memory_order_relaxed) && !stitch(i, *chunk))
                     stopped.store(true, std::memory_order_relaxed);
+                if constexpr (reusable) {
+                    std::lock_guard lock(spareLock);
+                    spare.push_back(std::move(chunk));
+                }
             },
             slots.size(), threads);
     }
