@@ -26,7 +26,7 @@ test: build
 # The parallel reading path and the worker pool under the thread sanitizer:
 # only their tests and the readers they drive are built, and the imports of
 # those readers side by side on four threads.
-TSAN_ONLY = ZonCldFormatAscii.m|ZonCldFormatLeica.m|ZonCldFormatCgo.m|ZonCldAsciiUserFormat.m|ZonCldFormatStl.m|test_parallel_read|test_worker_pool|test_concurrency
+TSAN_ONLY = ZonCldFormatAscii.m|ZonCldFormatLeica.m|ZonCldFormatCgo.m|ZonCldAsciiUserFormat.m|ZonCldFormatStl.m|ZonCldFormatKreon.m|ZonCldFormatOpton.m|test_parallel_read|test_worker_pool|test_concurrency
 
 sanitize:
 	$(MAKE) test BUILD=build-asan CMAKE_FLAGS="-DZON_SANITIZE=ON -DZON_BENCH=OFF -DCMAKE_BUILD_TYPE=Debug"
