@@ -29,40 +29,12 @@ T Little(const unsigned char* p)
 
 }  // namespace
 
-ZonCloudReadKreonBin::ZonCloudReadKreonBin(const ZonUnicodeString& fileName)
-    : ZonCloudReadFile(fileName),
-      _fill([this](std::uint64_t row, const unsigned char* bytes, ZonCloudGridRow& target) {
-          return FillRow(row, bytes, target);
-      })
-{
-}
-
-void ZonCloudReadKreonBin::SetSamplingPercent(float percent)
-{
-    const float before = _samplingPercent;
-    ZonCloudReadFile::SetSamplingPercent(percent);
-    if (_samplingPercent != before) {
-        _cloudRead = false;
-        _gridRows.Clear();
-    }
-}
+ZonCloudReadKreonBin::ZonCloudReadKreonBin(const ZonUnicodeString& fileName) : ZonCloudReadRowTable(fileName) {}
 
 ZonCloudReadKreonBin::GridKind ZonCloudReadKreonBin::GetGridKind()
 {
     Analyse();
     return _kind;
-}
-
-unsigned ZonCloudReadKreonBin::GetNumberOfRows()
-{
-    Analyse();
-    return static_cast<unsigned>(_rows);
-}
-
-unsigned ZonCloudReadKreonBin::GetNumberOfColumns()
-{
-    Analyse();
-    return static_cast<unsigned>(_columns);
 }
 
 // ---- Analysis ---------------------------------------------------------------
@@ -72,10 +44,7 @@ void ZonCloudReadKreonBin::AnalyseFile()
     _numberOfPoints = 0;
     _boundingBox = ZonMathBox();
     _boxKnown = false;
-    _cloud.clear();
-    _cloudRead = false;
-    _cursor.Reset();
-    _gridRows.Clear();
+    ResetRows();
 
     ZonCloudByteSource& source = Source();
     unsigned char header[HeaderSize];
@@ -130,6 +99,7 @@ void ZonCloudReadKreonBin::AnalyseFile()
         }
     }
     _boxKnown = false;
+    SetTable({_values, _columns * ValueSize, _rows}, _columns);
     // Counts are 16-bit each: the product always fits.
     _numberOfPoints = static_cast<int>(nodes);
     _digitizationType = DigitizationGrids;
@@ -206,62 +176,4 @@ std::uint64_t ZonCloudReadKreonBin::FillRow(std::uint64_t row, const unsigned ch
         if (slot >= 0) target.Set(static_cast<std::size_t>(slot), p[0], p[1], p[2]);
     });
     return 0;
-}
-
-void ZonCloudReadKreonBin::ListOwnedArrays(ZonCloudOwnedArrays& arrays) { _gridRows.ListOwnedArrays(arrays); }
-
-const float* ZonCloudReadKreonBin::GetPoints(unsigned& count)
-{
-    count = 0;
-    Analyse();
-    if (!_cloudRead) {
-        _cloud.clear();
-        Guarded([&] {
-            Reserve(_cloud, 3 * _rows * ZonCloudGridRow::SlotsFor(_columns, _samplingPercent));
-            ZonCloudGridRows::AppendAll(Source(), ValueTable(), _fill, _cloud);
-        });
-        _cloudRead = true;
-    }
-    count = static_cast<unsigned>(_cloud.size() / 3);
-    return _cloud.empty() ? nullptr : _cloud.data();
-}
-
-void ZonCloudReadKreonBin::RequireGrid()
-{
-    Analyse();
-    if (_digitizationType != DigitizationGrids) Tool::Raise(Tool::Usage, "ERR_NotAGridDigit");
-}
-
-void ZonCloudReadKreonBin::BeginGetGrid()
-{
-    RequireGrid();
-    _cursor.Begin(1);
-}
-
-bool ZonCloudReadKreonBin::NextGrid()
-{
-    RequireGrid();
-    return _cursor.Next();
-}
-
-void ZonCloudReadKreonBin::BeginGetGridPoints()
-{
-    RequireGrid();
-    _cursor.BeginRows();
-    _gridRows.Clear();
-}
-
-const float* ZonCloudReadKreonBin::GetGridPoints(unsigned& count, const unsigned char*& valid)
-{
-    count = 0;
-    valid = nullptr;
-    RequireGrid();
-    if (!_cursor.NextRow(static_cast<std::size_t>(_rows))) return nullptr;
-    const float* points = nullptr;
-    Guarded([&] {
-        std::uint64_t measured = 0;
-        const ZonCloudGridRow& row = _gridRows.Get(Source(), ValueTable(), _cursor.Row(), _fill, measured);
-        points = row.Deliver(count, valid);
-    });
-    return points;
 }

@@ -2,11 +2,7 @@
 #include <cstdint>
 #include <vector>
 
-#include "ZonCloudGridCursor.h"
-#include "ZonCloudGridRow.h"
-#include "ZonCloudGridRows.h"
-#include "ZonCloudReadFile.h"
-#include "ZonTieCloudReadFile.h"
+#include "ZonCloudReadRowTable.h"
 
 // Range grids of a laser scanner: one range value per node, the nodes laid
 // out in a plane or around a cylinder (whose rows may each have their own
@@ -18,7 +14,7 @@
 // column i lies at the angle i * 2 pi / N. The analysis checks the header,
 // reads the row centres and walks the value table once for the box; rows are
 // then read back straight from the table, a batch at a time on all cores.
-class ZonCloudReadKreonBin : public ZonCloudReadFile, public ZonTieCloudReadGridFile<ZonCloudReadKreonBin> {
+class ZonCloudReadKreonBin : public ZonCloudReadRowTable {
 public:
     enum GridKind { Planar = 1, Cylindrical = 2, CylindricalWithCentres = 6 };
     // The value of a node without measurement.
@@ -26,28 +22,15 @@ public:
 
     explicit ZonCloudReadKreonBin(const ZonUnicodeString& fileName);
 
-    // ZonICloudReadFile: the measured nodes, sampled along each row as the rows are.
-    void SetSamplingPercent(float percent) override;
-    const float* GetPoints(unsigned& count) override;
     // The box of the measured nodes, worked out on the first request (a walk
     // over the rows needs none).
     void GetBoundingBox(ZonMathBox& box) override;
 
-    // ZonICloudReadGridFile: one grid of M rows.
-    void BeginGetGrid() override;
-    bool NextGrid() override;
-    void BeginGetGridPoints() override;
-    const float* GetGridPoints(unsigned& count, const unsigned char*& valid) override;
-    using ZonCloudReadFile::GetGridPointsInBox;
-    using ZonCloudReadFile::GetGridPointsInBoxDouble;
-
     GridKind GetGridKind();
-    unsigned GetNumberOfRows();
-    unsigned GetNumberOfColumns();
 
 protected:
     void AnalyseFile() override;
-    void ListOwnedArrays(ZonCloudOwnedArrays& arrays) override;
+    std::uint64_t FillRow(std::uint64_t row, const unsigned char* bytes, ZonCloudGridRow& target) const override;
 
 private:
     // Calls visit(column, point) for each measured node of row j (from 0)
@@ -55,9 +38,6 @@ private:
     // rows may be read side by side.
     template <class Visit>
     void ForEachMeasured(std::uint64_t row, const unsigned char* bytes, Visit visit) const;
-    std::uint64_t FillRow(std::uint64_t row, const unsigned char* bytes, ZonCloudGridRow& target) const;
-    ZonCloudGridRows::Table ValueTable() const { return {_values, _columns * ValueSize, _rows}; }
-    void RequireGrid();
 
     static constexpr std::uint64_t ValueSize = 4;
 
@@ -74,10 +54,4 @@ private:
     std::vector<double> _columnBase, _columnScale;
     bool _boxKnown = false;
     std::vector<unsigned char> _buffer;
-
-    ZonCloudGridCursor _cursor;
-    ZonCloudGridRows _gridRows;
-    const ZonCloudGridRows::Fill _fill;  // FillRow
-    std::vector<float> _cloud;
-    bool _cloudRead = false;
 };

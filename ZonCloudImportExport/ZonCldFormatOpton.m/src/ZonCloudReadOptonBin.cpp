@@ -34,35 +34,7 @@ std::uint64_t Count(float value)
 
 }  // namespace
 
-ZonCloudReadOptonBin::ZonCloudReadOptonBin(const ZonUnicodeString& fileName)
-    : ZonCloudReadFile(fileName),
-      _fill([this](std::uint64_t row, const unsigned char* bytes, ZonCloudGridRow& target) {
-          return FillRow(row, bytes, target);
-      })
-{
-}
-
-void ZonCloudReadOptonBin::SetSamplingPercent(float percent)
-{
-    const float before = _samplingPercent;
-    ZonCloudReadFile::SetSamplingPercent(percent);
-    if (_samplingPercent != before) {
-        _cloudRead = false;
-        _gridRows.Clear();
-    }
-}
-
-unsigned ZonCloudReadOptonBin::GetNumberOfRows()
-{
-    Analyse();
-    return static_cast<unsigned>(_rows);
-}
-
-unsigned ZonCloudReadOptonBin::GetNumberOfColumns()
-{
-    Analyse();
-    return static_cast<unsigned>(_columns);
-}
+ZonCloudReadOptonBin::ZonCloudReadOptonBin(const ZonUnicodeString& fileName) : ZonCloudReadRowTable(fileName) {}
 
 std::uint64_t ZonCloudReadOptonBin::GetDataOffset()
 {
@@ -76,10 +48,7 @@ void ZonCloudReadOptonBin::AnalyseFile()
 {
     _numberOfPoints = 0;
     _boundingBox = ZonMathBox();
-    _cloud.clear();
-    _cloudRead = false;
-    _cursor.Reset();
-    _gridRows.Clear();
+    ResetRows();
 
     ZonCloudByteSource& source = Source();
     unsigned char header[HeaderRecords * RecordSize];
@@ -102,15 +71,16 @@ void ZonCloudReadOptonBin::AnalyseFile()
     _boundingBox.AddPoint(Word(record(4), 0), Word(record(4), 1), Word(record(4), 2));
 
     const std::uint64_t points = Count(Word(record(6), 0));
-    _rows = Count(Word(record(6), 1));
-    _columns = Count(Word(record(6), 2));
-    if (points != _rows * _columns) NotThisFormat();
+    const std::uint64_t rows = Count(Word(record(6), 1));
+    const std::uint64_t columns = Count(Word(record(6), 2));
+    if (points != rows * columns) NotThisFormat();
     if (points == 0) Tool::Raise(Tool::Data, "ERR_NoPointFound");
     if (!source.Fits(_data, points, RecordSize)) {
         errno = ENODATA;
         Tool::Raise(Tool::Input, nullptr);
     }
     if (points > static_cast<std::uint64_t>(std::numeric_limits<int>::max())) Tool::Raise(Tool::Data, "ERR_UnknownData");
+    SetTable({_data, columns * RecordSize, rows}, columns);
     _numberOfPoints = static_cast<int>(points);
     _digitizationType = DigitizationGrids;
 }
@@ -119,9 +89,9 @@ void ZonCloudReadOptonBin::AnalyseFile()
 
 std::uint64_t ZonCloudReadOptonBin::FillRow(std::uint64_t, const unsigned char* bytes, ZonCloudGridRow& target) const
 {
-    Allocating([&] { target.Start(_columns, _samplingPercent); });
+    Allocating([&] { target.Start(Columns(), _samplingPercent); });
     std::uint64_t measured = 0;
-    for (std::uint64_t column = 0; column < _columns; ++column, bytes += RecordSize) {
+    for (std::uint64_t column = 0; column < Columns(); ++column, bytes += RecordSize) {
         if (Word(bytes, 3) == NotMeasured) continue;
         ++measured;
         const std::int64_t slot = target.SlotOf(column);
@@ -130,70 +100,8 @@ std::uint64_t ZonCloudReadOptonBin::FillRow(std::uint64_t, const unsigned char* 
     return measured;
 }
 
-ZonCloudGridRows::Table ZonCloudReadOptonBin::RecordTable() const { return {_data, _columns * RecordSize, _rows}; }
-
-void ZonCloudReadOptonBin::ListOwnedArrays(ZonCloudOwnedArrays& arrays) { _gridRows.ListOwnedArrays(arrays); }
-
-const float* ZonCloudReadOptonBin::GetPoints(unsigned& count)
+void ZonCloudReadOptonBin::WholeFileRead(std::uint64_t measured, bool asCloud)
 {
-    count = 0;
-    Analyse();
-    if (!_cloudRead) {
-        _cloud.clear();
-        std::uint64_t measured = 0;
-        Guarded([&] {
-            const std::uint64_t nodes = _rows * _columns;
-            Reserve(_cloud, 3 * std::min(nodes, _rows * ZonCloudGridRow::SlotsFor(_columns, _samplingPercent)));
-            measured = ZonCloudGridRows::AppendAll(Source(), RecordTable(), _fill, _cloud);
-        });
-        _cloudRead = true;
-        _numberOfPoints = static_cast<int>(measured);
-        if (measured == 0) Tool::Raise(Tool::Data, "ERR_NoPointFound");
-    }
-    count = static_cast<unsigned>(_cloud.size() / 3);
-    return _cloud.empty() ? nullptr : _cloud.data();
-}
-
-void ZonCloudReadOptonBin::RequireGrid()
-{
-    Analyse();
-    if (_digitizationType != DigitizationGrids) Tool::Raise(Tool::Usage, "ERR_NotAGridDigit");
-}
-
-void ZonCloudReadOptonBin::BeginGetGrid()
-{
-    RequireGrid();
-    _cursor.Begin(1);
-}
-
-bool ZonCloudReadOptonBin::NextGrid()
-{
-    RequireGrid();
-    return _cursor.Next();
-}
-
-void ZonCloudReadOptonBin::BeginGetGridPoints()
-{
-    RequireGrid();
-    _cursor.BeginRows();
-    _gridRows.Clear();
-    _measuredInWalk = 0;
-}
-
-const float* ZonCloudReadOptonBin::GetGridPoints(unsigned& count, const unsigned char*& valid)
-{
-    count = 0;
-    valid = nullptr;
-    RequireGrid();
-    if (!_cursor.NextRow(static_cast<std::size_t>(_rows))) return nullptr;
-    const float* points = nullptr;
-    Guarded([&] {
-        std::uint64_t measured = 0;
-        const ZonCloudGridRow& row = _gridRows.Get(Source(), RecordTable(), _cursor.Row(), _fill, measured);
-        _measuredInWalk += measured;
-        points = row.Deliver(count, valid);
-    });
-    // The last row of a walk from the first: the file has been read whole.
-    if (_cursor.Row() + 1 == _rows) _numberOfPoints = static_cast<int>(_measuredInWalk);
-    return points;
+    _numberOfPoints = static_cast<int>(measured);
+    if (asCloud && measured == 0) Tool::Raise(Tool::Data, "ERR_NoPointFound");
 }
