@@ -11,6 +11,29 @@
 
 namespace zontest {
 
+// Every row a grid reader gives, points and validity, grid after grid.
+struct GridRows {
+    std::vector<std::vector<float>> points;
+    std::vector<std::vector<int>> valid;
+};
+
+template <class Reader>
+GridRows ReadGridRows(Reader& reader)
+{
+    GridRows rows;
+    reader.BeginGetGrid();
+    while (reader.NextGrid()) {
+        reader.BeginGetGridPoints();
+        unsigned n = 0;
+        const unsigned char* v = nullptr;
+        while (const float* p = reader.GetGridPoints(n, v)) {
+            rows.points.emplace_back(p, p + 3 * n);
+            rows.valid.emplace_back(v, v + n);
+        }
+    }
+    return rows;
+}
+
 // Appends a value's bytes, little-endian, or reversed when `reversed`.
 template <class T>
 void PutOrdered(std::string& bytes, T value, bool reversed = false)

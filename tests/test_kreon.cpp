@@ -21,26 +21,8 @@ using Reader = ZonCloudReadKreonBin;
 
 constexpr float Hole = -32767.0f;
 
-struct Rows {
-    std::vector<Floats> points;
-    std::vector<Flags> valid;
-};
-
-Rows ReadRows(Reader& reader)
-{
-    Rows rows;
-    reader.BeginGetGrid();
-    while (reader.NextGrid()) {
-        reader.BeginGetGridPoints();
-        unsigned n = 0;
-        const unsigned char* v = nullptr;
-        while (const float* p = reader.GetGridPoints(n, v)) {
-            rows.points.emplace_back(p, p + 3 * n);
-            rows.valid.emplace_back(v, v + n);
-        }
-    }
-    return rows;
-}
+using Rows = zontest::GridRows;
+Rows ReadRows(Reader& reader) { return zontest::ReadGridRows(reader); }
 
 class Kreon : public zontest::FilesTest {
 protected:

@@ -17,26 +17,8 @@ using Floats = std::vector<float>;
 using Flags = std::vector<int>;
 using Reader = ZonCloudReadOptonBin;
 
-struct Rows {
-    std::vector<Floats> points;
-    std::vector<Flags> valid;
-};
-
-Rows ReadRows(Reader& reader)
-{
-    Rows rows;
-    reader.BeginGetGrid();
-    while (reader.NextGrid()) {
-        reader.BeginGetGridPoints();
-        unsigned n = 0;
-        const unsigned char* v = nullptr;
-        while (const float* p = reader.GetGridPoints(n, v)) {
-            rows.points.emplace_back(p, p + 3 * n);
-            rows.valid.emplace_back(v, v + n);
-        }
-    }
-    return rows;
-}
+using Rows = zontest::GridRows;
+Rows ReadRows(Reader& reader) { return zontest::ReadGridRows(reader); }
 
 // Two rows of three nodes; one not measured, one whose fourth value is close to -1 but not it.
 OptonGrid TwoByThree()

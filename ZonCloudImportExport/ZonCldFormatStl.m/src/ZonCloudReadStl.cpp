@@ -313,14 +313,18 @@ void ZonCloudReadStl::AnalyseText()
             break;
         }
         if (retry) continue;
-        if (found == 0) Tool::Raise(Tool::Data, "ERR_NoPointFound");
-        const std::uint64_t triangles = std::min<std::uint64_t>(found / 3, kMaxTriangles);
-        _triangleCount = static_cast<std::uint32_t>(triangles);
-        _vertexCount = static_cast<std::uint32_t>(std::min<std::uint64_t>(found, 3 * kMaxTriangles));
-        _boundingBox = box.Box();
-        _separatorSwitched = separator.IsSwitched();
+        KeepTextAnalysis(found, box.Box(), separator.IsSwitched());
         return;
     }
+}
+
+void ZonCloudReadStl::KeepTextAnalysis(std::uint64_t corners, const ZonMathBox& box, bool separatorSwitched)
+{
+    if (corners == 0) Tool::Raise(Tool::Data, "ERR_NoPointFound");
+    _triangleCount = static_cast<std::uint32_t>(std::min<std::uint64_t>(corners / 3, kMaxTriangles));
+    _vertexCount = static_cast<std::uint32_t>(std::min<std::uint64_t>(corners, 3 * kMaxTriangles));
+    _boundingBox = box;
+    _separatorSwitched = separatorSwitched;
 }
 
 void ZonCloudReadStl::AnalyseBinary()
@@ -651,12 +655,7 @@ void ZonCloudReadStl::AnalyseTextInChunks(const unsigned char* text, std::vector
         };
         ZonCloudChunkedText::Run<CornerChunk<T>>(_source, text, 0, kLineMax, parse, stitch);
         if (retry) continue;
-        if (found == 0) Tool::Raise(Tool::Data, "ERR_NoPointFound");
-        const std::uint64_t triangles = std::min<std::uint64_t>(found / 3, kMaxTriangles);
-        _triangleCount = static_cast<std::uint32_t>(triangles);
-        _vertexCount = static_cast<std::uint32_t>(std::min<std::uint64_t>(found, 3 * kMaxTriangles));
-        _boundingBox = box.Box();
-        _separatorSwitched = separator.IsSwitched();
+        KeepTextAnalysis(found, box.Box(), separator.IsSwitched());
         ShrinkIfLoose(vertices);
         _distinctCount = vertices.size() / 3;
         _premerged = true;

@@ -73,6 +73,9 @@ private:
     bool IsTextCandidate();
     bool HasVertexLineNearStart();
     void AnalyseText();
+    // What a text analysis keeps, on both paths: counts from the corners
+    // found (none is an error), the box and the decimal separator used.
+    void KeepTextAnalysis(std::uint64_t corners, const ZonMathBox& box, bool separatorSwitched);
     void AnalyseBinary();
     // Large files, read on every core from the mapped file: the analysis
     // merges the mesh on the way, so the file is read once.
